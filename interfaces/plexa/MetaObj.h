@@ -1,0 +1,134 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// Typed values: what a command's schema declares and what its result holds.
+//
+// A command builds the same kind of object twice: once empty, as the schema that help and formatters read, and once
+// filled, as the result of a call. A scalar therefore knows whether it was set. Formatters leave a field that is not
+// set out, or print it empty or null; they never invent a default. Values are handed around by boost::shared_ptr and
+// are not synchronised: one thread at a time.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include <boost/shared_ptr.hpp>
+
+// Everything is built with hidden visibility; what libplexa offers across its boundary carries this mark.
+#define PLEXA_EXPORT __attribute__((visibility("default")))
+
+namespace Plexa::MetaObj {
+
+/// What the elements of a list are. Commands use StringList and StructList only.
+enum MetaType { Int = 0, Bool = 1, StringList = 2, StructList = 3 };
+
+/// Base of every value.
+class PLEXA_EXPORT MetaObject {
+public:
+    virtual ~MetaObject();
+    /// False for a scalar that only declares a type; a list and a structure are always set.
+    virtual bool IsSet() const;
+
+protected:
+    MetaObject() = default;
+    MetaObject(MetaObject const &) = default;
+    MetaObject &operator=(MetaObject const &) = default;
+};
+
+/// A boolean, or the declaration of one. GetValue of an empty one is false.
+class PLEXA_EXPORT MetaBool : public MetaObject {
+public:
+    static boost::shared_ptr<MetaBool> New();
+    static boost::shared_ptr<MetaBool> New(bool value);
+    ~MetaBool() override;
+    bool IsSet() const override;
+    bool GetValue() const;
+
+private:
+    bool set_ = false;
+    bool value_ = false;
+};
+
+/// A signed 64-bit integer, or the declaration of one. GetValue of an empty one is 0.
+class PLEXA_EXPORT MetaInt : public MetaObject {
+public:
+    static boost::shared_ptr<MetaInt> New();
+    static boost::shared_ptr<MetaInt> New(int64_t value);
+    ~MetaInt() override;
+    bool IsSet() const override;
+    int64_t GetValue() const;
+
+private:
+    bool set_ = false;
+    int64_t value_ = 0;
+};
+
+/// A text, or the declaration of one. GetValue of an empty one is "".
+class PLEXA_EXPORT MetaString : public MetaObject {
+public:
+    static boost::shared_ptr<MetaString> New();
+    static boost::shared_ptr<MetaString> New(std::string const &value);
+    ~MetaString() override;
+    bool IsSet() const override;
+    std::string GetValue() const;
+
+private:
+    bool set_ = false;
+    std::string value_;
+};
+
+/// An ordered list. The element schema tells formatters and help what an element looks like when there is none yet.
+class PLEXA_EXPORT MetaList : public MetaObject {
+public:
+    static boost::shared_ptr<MetaList> New(MetaType type);
+    static boost::shared_ptr<MetaList> New(MetaType type, boost::shared_ptr<MetaObject> const &elementSchema);
+    ~MetaList() override;
+    MetaType GetType() const;
+    /// Empty when the list was made without one.
+    boost::shared_ptr<MetaObject> GetElementSchema() const;
+    void Append(boost::shared_ptr<MetaObject> const &element);
+    std::vector<boost::shared_ptr<MetaObject>> GetElements() const;
+
+private:
+    MetaType type_ = StringList;
+    boost::shared_ptr<MetaObject> elementSchema_;
+    std::vector<boost::shared_ptr<MetaObject>> elements_;
+};
+
+/// A structure: named fields in declared order. A field set again replaces its value and keeps its place.
+class PLEXA_EXPORT MetaStruct : public MetaObject {
+public:
+    static boost::shared_ptr<MetaStruct> New(std::string const &name);
+    ~MetaStruct() override;
+
+    void SetField(std::string const &field, boost::shared_ptr<MetaBool> const &value);
+    void SetField(std::string const &field, boost::shared_ptr<MetaInt> const &value);
+    void SetField(std::string const &field, boost::shared_ptr<MetaList> const &value);
+    void SetField(std::string const &field, boost::shared_ptr<MetaString> const &value);
+    /// The text is copied; a null pointer is taken as "".
+    void SetField(std::string const &field, char const *value);
+    void SetField(std::string const &field, int64_t value);
+    void SetField(std::string const &field, std::string const &value);
+    /// Becomes a MetaList of type StringList whose elements are MetaStrings.
+    void SetField(std::string const &field, std::vector<std::string> const &value);
+    /// These two keep `true` and a literal 0 from picking a pointer overload.
+    void SetField(std::string const &field, bool value);
+    void SetField(std::string const &field, int value);
+
+    std::string GetName() const;
+    std::vector<std::string> GetFieldNames() const;
+    /// Empty when the structure has no such field.
+    boost::shared_ptr<MetaObject> GetField(std::string const &field) const;
+
+private:
+    struct Field {
+        std::string name;
+        boost::shared_ptr<MetaObject> value;
+    };
+    void Store(std::string const &field, boost::shared_ptr<MetaObject> const &value);
+
+    std::string name_;
+    std::vector<Field> fields_;
+};
+
+} // namespace Plexa::MetaObj
