@@ -1,0 +1,24 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <string>
+
+#include <kj/timer.h>
+
+#include "orka/Provider.h"
+
+namespace Orka {
+
+/// What every provider is made with. The timer is the caller's and outlives the providers and their promises.
+struct ProviderSurroundings {
+    kj::Timer &timer;
+    std::function<std::string()> newUuid; ///< canonical ids for new volumes; null: random ones
+};
+
+/// Makes the provider that a URL names. Nothing is opened or connected before the first operation.
+/// @throws Wire::Failure InvalidArgument for a URL of no scheme that is supported, or one that is not well-formed.
+std::unique_ptr<Provider> makeProvider(std::string const &url, ProviderSurroundings const &surroundings);
+
+} // namespace Orka
