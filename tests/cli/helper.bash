@@ -1,0 +1,156 @@
+# SPDX-License-Identifier: Apache-2.0
+# shellcheck shell=bash
+# What the transcripts share: a host in a box for each test, running the tool, and looking at what it left.
+#
+# The build's directory comes from TOVI_BUILD_DIR, which ctest sets. Every test runs on a root of its own and starts and
+# stops its own lumod. Output is compared whole, to the newline: $out and $err are files.
+
+bats_require_minimum_version 1.5.0
+
+top="$(cd "$(dirname "${BASH_SOURCE[0]}")/../.." && pwd)"
+: "${TOVI_BUILD_DIR:?run the transcripts through ctest, or set TOVI_BUILD_DIR to a build directory}"
+export PATH="$TOVI_BUILD_DIR/bin:$PATH"
+unset TOVI_ROOT TOVI_OFFLINE TOVI_TIMEOUT_MS TOVI_REQUEST_ID TOVI_LOG_LEVEL
+
+out="$BATS_TEST_TMPDIR/out"
+err="$BATS_TEST_TMPDIR/err"
+status=0
+
+# host_up [lab/up options]: a fresh root with one array, served by a lumod; what follows works on it.
+host_up() {
+    local settings
+    settings="$("$top/lab/up" --root "$BATS_TEST_TMPDIR/host" --build "$TOVI_BUILD_DIR" "$@" 2>"$BATS_TEST_TMPDIR/up")" || {
+        cat "$BATS_TEST_TMPDIR/up" >&2
+        return 1
+    }
+    eval "$settings"
+}
+
+# host_down: stops this test's lumod, if it runs; the root stays for whoever looks into a failure.
+host_down() {
+    if [ -e "$BATS_TEST_TMPDIR/host/run/lab.daemon" ]; then
+        "$top/lab/down" --root "$BATS_TEST_TMPDIR/host" 2>"$BATS_TEST_TMPDIR/down" || {
+            cat "$BATS_TEST_TMPDIR/down" >&2
+            return 1
+        }
+    fi
+}
+
+# host_without_daemon: a root as a host has it whose daemon was never started.
+host_without_daemon() {
+    export TOVI_ROOT="$BATS_TEST_TMPDIR/host"
+    mkdir -p "$TOVI_ROOT"
+}
+
+teardown() {
+    host_down
+}
+
+# tovi ARGS...: runs the tool; leaves $status, and what it wrote in $out and $err.
+tovi() {
+    status=0
+    tovicli "$@" >"$out" 2>"$err" </dev/null || status=$?
+}
+
+# lumo ARGS...: a command of the subtree that this project adds.
+lumo() {
+    tovi storage internal lumo "$@"
+}
+
+# json_of ARGS...: the same in JSON.
+json_of() {
+    tovi --format json storage internal lumo "$@"
+}
+
+register_provider() {
+    lumo orkaprovider add --vp-name "${1:-lab}" --vp-url "${2:-$LUMO_ARRAY_URL}"
+    expect_status 0
+}
+
+load_containers() {
+    lumo storagecontainer load
+    expect_status 0
+}
+
+# What a failed expectation prints: the whole of what was seen.
+mismatch() {
+    {
+        echo "expected $1"
+        echo "--- status $status; standard output:"
+        cat -A "$out"
+        echo "--- standard error:"
+        cat -A "$err"
+    } >&2
+    return 1
+}
+
+expect_status() {
+    [ "$status" -eq "$1" ] || mismatch "status $1"
+}
+
+# expect_out TEXT: standard output is exactly this, byte for byte; expect_out - takes it from standard input.
+expect_out() {
+    expect_file "$out" "standard output" "$1"
+}
+
+# expect_err TEXT: the same for standard error.
+expect_err() {
+    expect_file "$err" "standard error" "$1"
+}
+
+expect_file() {
+    if [ "$3" = - ]; then
+        cat >"$BATS_TEST_TMPDIR/expected"
+    else
+        printf '%s' "$3" >"$BATS_TEST_TMPDIR/expected"
+    fi
+    cmp -s "$1" "$BATS_TEST_TMPDIR/expected" || {
+        diff -u "$BATS_TEST_TMPDIR/expected" "$1" >&2 || true
+        mismatch "$2: $(cat -A "$BATS_TEST_TMPDIR/expected")"
+    }
+}
+
+# expect_err_has TEXT...: standard error holds each of these.
+expect_err_has() {
+    local text
+    for text in "$@"; do
+        grep -qF -- "$text" "$err" || mismatch "standard error to hold: $text"
+    done
+}
+
+expect_out_has() {
+    local text
+    for text in "$@"; do
+        grep -qF -- "$text" "$out" || mismatch "standard output to hold: $text"
+    done
+}
+
+# expect_failure STATUS TEXT...: this status, nothing on standard output, each text on standard error.
+expect_failure() {
+    expect_status "$1"
+    expect_out ""
+    expect_err_has "${@:2}"
+}
+
+# expect_done TEXT: status 0, exactly this on standard output, nothing on standard error.
+expect_done() {
+    expect_status 0
+    expect_out "$1"
+    expect_err ""
+}
+
+# expect_json EXPRESSION: standard output is one JSON document d for which the Python expression holds.
+expect_json() {
+    python3 -c 'import json, sys
+d = json.load(open(sys.argv[1]))
+result = eval(sys.argv[2])
+if result is not True:
+    sys.exit(f"{sys.argv[2]} gives {result!r}")' "$out" "$1" || mismatch "JSON for which this holds: $1"
+}
+
+# json_value EXPRESSION: prints what the expression makes of the document d.
+json_value() {
+    python3 -c 'import json, sys
+d = json.load(open(sys.argv[1]))
+print(eval(sys.argv[2]))' "$out" "$1"
+}
