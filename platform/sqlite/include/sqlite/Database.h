@@ -1,0 +1,109 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// How every database file of ours is opened, so that all of them are equally safe.
+//
+// A file carries an identity: an application id that says whose it is and a user version that says how it is laid out.
+// A file of somebody else, of a newer version of ours, or that is no database is refused before anything could change a
+// byte of it. What is committed is durable when the commit returns (rollback journal, synchronous=EXTRA: the journal's
+// directory entry is synced too); what was not committed when a process was killed is rolled back by whoever opens the
+// file next, a reader included. Waiting for another process's lock ends after the busy timeout with ErrorKind::Busy.
+//
+// Called by the host store and by the array file. A database, its queries and its transactions belong to one thread at
+// a time. Everything throws Sqlite::Error.
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+#include "sqlite/Error.h"
+#include "sqlite/Query.h"
+
+namespace SQLite {
+class Database;
+class Statement;
+} // namespace SQLite
+
+namespace Sqlite {
+
+/// What makes a file one of ours of a certain kind.
+struct Identity {
+    /// Not 0, which is what a database of nobody carries.
+    int32_t applicationId = 0;
+    /// Starts at 1. A file of a higher version is refused; there are no older ones yet.
+    int32_t userVersion = 0;
+    /// Statements that make the empty layout; every table STRICT.
+    std::string schema;
+    /// For sentences, with its article: "the host store".
+    std::string kindName;
+};
+
+enum class Mode {
+    Create,    ///< reads and writes; makes the file and its layout, in one durable step, when it is missing or empty
+    ReadWrite, ///< reads and writes; the file must exist
+    /// Reads; the file must exist and is never made. The handle can write all the same, because a reader that could not
+    /// would be unable to roll back what a killed writer left behind; query_only keeps every statement from writing.
+    QueryOnly,
+};
+
+struct Options {
+    /// How long a statement waits for another process's lock. 0 never waits, which an event loop wants.
+    std::chrono::milliseconds busyTimeout{5000};
+};
+
+class Database {
+public:
+    /// Opens the file, checks its identity and sets up the connection. A file on a read-only file system opens in every
+    /// mode; a write then fails with ErrorKind::ReadOnly.
+    Database(std::string const &path, Identity const &identity, Mode mode, Options const &options = {});
+    ~Database();
+    Database(Database const &) = delete;
+    Database &operator=(Database const &) = delete;
+
+    /// A prepared statement, taken from a cache keyed by its text and returned to it when the query goes; keep the
+    /// texts fixed and bind what varies. The query must not outlive the database.
+    Query query(std::string_view sql);
+    /// Runs one or several statements that return nothing, uncached.
+    void execute(std::string const &sql);
+
+    int64_t lastInsertId() const;
+    /// Rows that the latest INSERT, UPDATE or DELETE touched.
+    int64_t changes() const;
+    /// Changes when another connection has committed since the last call; a commit of this one does not change it.
+    int64_t dataVersion();
+    /// Whether the path no longer leads to the file that is open (removed, or replaced by another).
+    bool hasMoved() const;
+    /// Whether the file can only be read (QueryOnly, a read-only file system, missing permission).
+    bool isReadOnly() const;
+    /// Reads the whole file; throws ErrorKind::Malformed naming the first damage. Takes time in proportion to its size.
+    void checkIntegrity();
+
+    std::string const &path() const noexcept {
+        return path_;
+    }
+
+private:
+    friend class Query;
+    friend class Transaction;
+    using Statement = std::unique_ptr<SQLite::Statement>;
+
+    void checkIdentity(bool wholeFile);
+    void configure(Options const &options);
+    void createLayout();
+    void giveBack(std::string_view sql, Statement statement) noexcept;
+    [[noreturn]] void fail(std::exception const &cause) const;
+
+    std::string path_;
+    Identity identity_;
+    Mode mode_;
+    int64_t busyTimeoutMs_;
+    std::unique_ptr<SQLite::Database> handle_;
+    /// Statements that no query uses now; several of one text when queries of it were nested.
+    std::unordered_map<std::string_view, std::vector<Statement>> idle_;
+};
+
+} // namespace Sqlite
