@@ -37,6 +37,7 @@ struct Request {
     getLumoInfo @17 :VolumeKey;
     unsharedChunksLumo @18 :VolumeKey;
     getLumoMetadata @19 :VolumeKey;
+    # These four answer with the volume as it is, or was, when they are done.
     createVirtualVolume @20 :CreateVirtualVolume;
     bindVirtualVolume @21 :VolumeKey;      # through an accessible endpoint; bound already is success
     unbindVirtualVolume @22 :VolumeKey;    # leaves the binding to the unbind timer
@@ -118,6 +119,8 @@ struct ProtocolEndpointEvent {
 }
 
 struct Reply {
+  # Requests are numbered from 1. A failure with id 0 answers no request in particular: it says why the daemon is about
+  # to close the connection (a caller it does not admit, a request that it could not read).
   id @0 :UInt64;
   last @1 :Bool = true;
   union {
