@@ -25,6 +25,7 @@
 
 namespace SQLite {
 class Database;
+class Exception;
 class Statement;
 } // namespace SQLite
 
@@ -90,20 +91,28 @@ private:
     friend class Query;
     friend class Transaction;
     using Statement = std::unique_ptr<SQLite::Statement>;
+    struct TextHash {
+        using is_transparent = void;
+        std::size_t operator()(std::string_view text) const noexcept {
+            return std::hash<std::string_view>()(text);
+        }
+    };
 
-    void checkIdentity(bool wholeFile);
-    void configure(Options const &options);
+    void open(Options const &options);
+    void checkIdentity();
+    void configure();
     void createLayout();
-    void giveBack(std::string_view sql, Statement statement) noexcept;
-    [[noreturn]] void fail(std::exception const &cause) const;
+    Statement take(std::string_view sql);
+    void giveBack(Statement statement) noexcept;
+    [[noreturn]] void fail(SQLite::Exception const &cause) const;
 
     std::string path_;
     Identity identity_;
     Mode mode_;
-    int64_t busyTimeoutMs_;
+    std::chrono::milliseconds busyTimeout_;
     std::unique_ptr<SQLite::Database> handle_;
     /// Statements that no query uses now; several of one text when queries of it were nested.
-    std::unordered_map<std::string_view, std::vector<Statement>> idle_;
+    std::unordered_map<std::string, std::vector<Statement>, TextHash, std::equal_to<>> idle_;
 };
 
 } // namespace Sqlite

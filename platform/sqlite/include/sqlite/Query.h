@@ -46,6 +46,9 @@ public:
     bool isNull(int column) const;
 
 private:
+    template <typename Read>
+    auto column(int index, Read const &read) const;
+
     Database *database_;
     std::unique_ptr<SQLite::Statement> statement_;
 };

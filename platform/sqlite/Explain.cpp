@@ -1,0 +1,75 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Explain.h"
+
+#include <cctype>
+#include <cerrno>
+#include <new>
+#include <system_error>
+
+#include <sqlite3.h>
+
+namespace Sqlite {
+namespace {
+
+std::string systemWords(int systemError, char const *otherwise) {
+    return systemError == 0 ? std::string(otherwise) : std::generic_category().message(systemError);
+}
+
+Error explainIo(int code, int systemError, char const *detail, std::string const &name) {
+    if (systemError == ENOSPC || systemError == EDQUOT) {
+        return Error(ErrorKind::DiskFull, name + " cannot be written: the disk is full; nothing was changed");
+    }
+    if (code == SQLITE_IOERR_NOMEM) {
+        throw std::bad_alloc();
+    }
+    std::string action = " cannot be read or written: ";
+    if (code == SQLITE_IOERR_FSYNC || code == SQLITE_IOERR_DIR_FSYNC) {
+        action = " cannot be written durably: ";
+    } else if (code == SQLITE_IOERR_READ || code == SQLITE_IOERR_SHORT_READ) {
+        action = " cannot be read: ";
+    }
+    return Error(ErrorKind::Io, name + action + systemWords(systemError, detail));
+}
+
+} // namespace
+
+std::string named(std::string const &kindName, std::string const &path) {
+    std::string name = kindName.empty() ? std::string("the database") : kindName;
+    name[0] = static_cast<char>(std::toupper(static_cast<unsigned char>(name[0])));
+    return name + " \"" + path + '"';
+}
+
+Error explain(int code, int systemError, char const *detail, std::string const &name,
+              std::chrono::milliseconds busyTimeout) {
+    switch (code & 0xff) {
+    case SQLITE_BUSY:
+    case SQLITE_LOCKED:
+        return Error(ErrorKind::Busy, busyTimeout.count() == 0
+                                          ? name + " is busy: another process is changing it"
+                                          : name + " is busy: another process has held its lock for " +
+                                                std::to_string(busyTimeout.count()) +
+                                                " ms; nothing was changed, try again");
+    case SQLITE_CORRUPT:
+    case SQLITE_NOTADB:
+        return Error(ErrorKind::Malformed, name + " is damaged: " + detail);
+    case SQLITE_READONLY:
+    case SQLITE_PERM:
+        return Error(ErrorKind::ReadOnly,
+                     name + " cannot be written: it, its directory or its file system is read-only");
+    case SQLITE_FULL:
+        return Error(ErrorKind::DiskFull, name + " cannot be written: the disk is full; nothing was changed");
+    case SQLITE_IOERR:
+        return explainIo(code, systemError, detail, name);
+    case SQLITE_CANTOPEN:
+        return Error(systemError == ENOENT ? ErrorKind::Missing : ErrorKind::Io,
+                     name + " cannot be opened: " + systemWords(systemError, detail));
+    case SQLITE_CONSTRAINT:
+        return Error(ErrorKind::Constraint, name + " refuses the change: " + detail);
+    case SQLITE_NOMEM:
+        throw std::bad_alloc();
+    default:
+        return Error(ErrorKind::Other, name + " cannot be used: " + detail);
+    }
+}
+
+} // namespace Sqlite
