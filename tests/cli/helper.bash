@@ -42,7 +42,10 @@ host_without_daemon() {
     mkdir -p "$TOVI_ROOT"
 }
 
+lock_holder=""
+
 teardown() {
+    release_lock
     host_down
 }
 
@@ -153,4 +156,24 @@ json_value() {
     python3 -c 'import json, sys
 d = json.load(open(sys.argv[1]))
 print(eval(sys.argv[2]))' "$out" "$1"
+}
+
+# hold_lock FILE: another process keeps the database for itself, until release_lock or the test's end.
+hold_lock() {
+    mkfifo "$BATS_TEST_TMPDIR/lock.go" "$BATS_TEST_TMPDIR/lock.held"
+    python3 -c 'import sqlite3, sys
+database = sqlite3.connect(sys.argv[1], isolation_level=None)
+database.execute("BEGIN EXCLUSIVE")
+print("held", flush=True)
+sys.stdin.read()' "$1" <>"$BATS_TEST_TMPDIR/lock.go" >"$BATS_TEST_TMPDIR/lock.held" 3>&- &
+    lock_holder=$!
+    read -r _ <"$BATS_TEST_TMPDIR/lock.held"
+}
+
+release_lock() {
+    [ -n "$lock_holder" ] || return 0
+    kill "$lock_holder"
+    wait "$lock_holder" 2>/dev/null || true
+    lock_holder=""
+    rm -f "$BATS_TEST_TMPDIR/lock.go" "$BATS_TEST_TMPDIR/lock.held"
 }
