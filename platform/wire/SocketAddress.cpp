@@ -6,7 +6,6 @@
 #include <cstring>
 
 #include <fcntl.h>
-#include <unistd.h>
 
 #include <boost/system/error_code.hpp>
 
@@ -20,26 +19,19 @@ SocketAddress::SocketAddress(std::string const &path) {
         std::size_t const slash = path.rfind('/');
         std::string const directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
         std::string const name = slash == std::string::npos ? path : path.substr(slash + 1);
-        directory_ = open(directory.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC);
-        if (directory_ < 0) {
+        directory_.reset(open(directory.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
+        if (!directory_) {
             boost::system::error_code const error(errno, boost::system::system_category());
             ErrorCode const code = error.value() == ENOENT ? ErrorCode::FileMissing : ErrorCode::IoError;
             throw Failure(code, "the directory of the socket " + path + " cannot be opened: " + error.message());
         }
-        usable = "/proc/self/fd/" + std::to_string(directory_) + "/" + name;
+        usable = "/proc/self/fd/" + std::to_string(directory_.get()) + "/" + name;
     }
     if (usable.size() >= sizeof address_.sun_path) {
-        close(directory_);
         throw Failure(ErrorCode::InvalidArgument, "the name of the socket " + path + " is too long");
     }
     address_.sun_family = AF_UNIX;
     std::memcpy(address_.sun_path, usable.c_str(), usable.size() + 1);
-}
-
-SocketAddress::~SocketAddress() {
-    if (directory_ >= 0) {
-        close(directory_);
-    }
 }
 
 sockaddr const *SocketAddress::get() const {

@@ -124,7 +124,7 @@ struct Reply {
   id @0 :UInt64;
   last @1 :Bool = true;
   union {
-    failure @2 :Failure;
+    failure @2 :FailureReply;
     done @3 :Void;
     pong @4 :Pong;
     storageArrays @5 :List(StorageArray);          # appended to the reply's table of arrays
@@ -140,7 +140,8 @@ struct Reply {
   }
 }
 
-struct Failure {
+struct FailureReply {
+  # What becomes a Wire::Failure on the other side.
   code @0 :Int32;
   sentence @1 :Text;         # a finished sentence for the user, with the particulars
 }

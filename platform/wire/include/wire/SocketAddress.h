@@ -6,24 +6,24 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 
+#include "wire/UniqueFd.h"
+
 namespace Wire {
 
 /// The address of a Unix socket, for bind and connect. A path that is too long for the kernel's 107 bytes is reached
 /// through a descriptor of its directory, which lives as long as this object: keep it until the call has returned.
 class SocketAddress {
 public:
-    /// @throw Failure the directory of a long path cannot be opened, or the name alone is too long
+    /// @throw Failure FileMissing or IoError when the directory of a long path cannot be opened, InvalidArgument when
+    ///        the name alone is too long
     explicit SocketAddress(std::string const &path);
-    ~SocketAddress();
-    SocketAddress(SocketAddress const &) = delete;
-    SocketAddress &operator=(SocketAddress const &) = delete;
 
     sockaddr const *get() const;
     socklen_t size() const;
 
 private:
     sockaddr_un address_{};
-    int directory_ = -1;
+    UniqueFd directory_;
 };
 
 } // namespace Wire
