@@ -1,0 +1,64 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Directory.h"
+
+#include <cerrno>
+#include <system_error>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "wire/Failure.h"
+
+namespace Store {
+namespace {
+
+constexpr mode_t directoryMode = 0755;
+
+[[noreturn]] void cannotMake(std::string const &path, int systemError) {
+    throw Wire::Failure(
+        systemError == ENOSPC || systemError == EDQUOT                          ? Wire::ErrorCode::DiskFull
+        : systemError == EROFS || systemError == EACCES || systemError == EPERM ? Wire::ErrorCode::FileReadOnly
+                                                                                : Wire::ErrorCode::IoError,
+        "The directory \"" + path + "\" cannot be made: " + std::generic_category().message(systemError));
+}
+
+std::string parentOf(std::string const &path) {
+    auto const end = path.find_last_not_of('/');
+    auto const slash = end == std::string::npos ? std::string::npos : path.rfind('/', end);
+    return slash == std::string::npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
+}
+
+void syncDirectory(std::string const &path) {
+    int const descriptor = ::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    if (descriptor < 0) {
+        return; // A parent that can be entered but not read: its own file system's order has to do.
+    }
+    int const systemError = ::fsync(descriptor) == 0 ? 0 : errno;
+    ::close(descriptor);
+    if (systemError != 0 && systemError != EINVAL) {
+        cannotMake(path, systemError);
+    }
+}
+
+} // namespace
+
+void makeDirectoryDurably(std::string const &path) {
+    if (::mkdir(path.c_str(), directoryMode) != 0) {
+        int systemError = errno;
+        if (systemError == ENOENT && parentOf(path) != path) {
+            makeDirectoryDurably(parentOf(path));
+            systemError = ::mkdir(path.c_str(), directoryMode) == 0 ? 0 : errno;
+        }
+        struct stat status {};
+        if (systemError == EEXIST && ::stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode)) {
+            return;
+        }
+        if (systemError != 0) {
+            cannotMake(path, systemError == EEXIST ? ENOTDIR : systemError);
+        }
+    }
+    syncDirectory(parentOf(path));
+}
+
+} // namespace Store

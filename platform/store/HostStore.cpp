@@ -1,0 +1,62 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "store/HostStore.h"
+
+#include "Directory.h"
+#include "Schema.h"
+#include "Translate.h"
+#include "sqlite/Database.h"
+#include "wire/Paths.h"
+
+namespace Store {
+
+HostStore::HostStore(std::string const &root, Mode mode, std::chrono::milliseconds busyTimeout)
+    : root_(root)
+    , path_(Wire::Paths(root).hostStore())
+    , mode_(mode)
+    , busyTimeout_(busyTimeout) {}
+
+HostStore::~HostStore() = default;
+
+Sqlite::Database *HostStore::reader() {
+    if (database_ && database_->hasMoved()) {
+        database_.reset();
+        ++generation_;
+    }
+    if (!database_) {
+        auto const how = mode_ == Mode::ReadWrite ? Sqlite::Mode::ReadWrite : Sqlite::Mode::QueryOnly;
+        try {
+            database_ = std::make_unique<Sqlite::Database>(path_, identity(), how, Sqlite::Options{busyTimeout_});
+        } catch (Sqlite::Error const &error) {
+            if (error.kind() != Sqlite::ErrorKind::Missing) {
+                throw;
+            }
+            return nullptr;
+        }
+        ++generation_;
+    }
+    return database_.get();
+}
+
+Sqlite::Database &HostStore::writer() {
+    if (mode_ == Mode::QueryOnly) {
+        throw Wire::Failure(Wire::ErrorCode::FileReadOnly,
+                            "The host store \"" + path_ + "\" was opened for reading only");
+    }
+    if (reader() == nullptr) {
+        makeDirectoryDurably(root_);
+        database_ =
+            std::make_unique<Sqlite::Database>(path_, identity(), Sqlite::Mode::Create, Sqlite::Options{busyTimeout_});
+        ++generation_;
+    }
+    return *database_;
+}
+
+int64_t HostStore::dataVersion() {
+    return translated([this] {
+        Sqlite::Database *const database = reader();
+        // SQLite's own number begins anew with each connection, and is 32 bits wide.
+        return generation_ * (int64_t{1} << 32) + (database == nullptr ? 0 : database->dataVersion());
+    });
+}
+
+} // namespace Store

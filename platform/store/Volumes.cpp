@@ -1,0 +1,163 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Translate.h"
+#include "sqlite/Database.h"
+#include "sqlite/Transaction.h"
+#include "store/HostStore.h"
+
+namespace Store {
+namespace {
+
+Volume readVolume(Sqlite::Query const &row) {
+    return {row.text(0), row.text(1), row.text(2), static_cast<VolumeState>(row.integer(3))};
+}
+
+/// Every row of a query whose columns are uuid, container id, directory name and state.
+std::vector<Volume> readAll(Sqlite::Query &query) {
+    std::vector<Volume> volumes;
+    while (query.step()) {
+        volumes.push_back(readVolume(query));
+    }
+    return volumes;
+}
+
+std::optional<Volume> readOne(Sqlite::Query &query) {
+    return query.step() ? std::optional<Volume>(readVolume(query)) : std::nullopt;
+}
+
+/// Only a record that is still in the state that was seen: another process may have gone on meanwhile.
+void settle(Sqlite::Database &database, Volume const &volume) {
+    switch (volume.state) {
+    case VolumeState::Mounting:
+        Sqlite::Query(database, "UPDATE volume SET state = 0 WHERE uuid = ?1 AND state = 2").bind(1, volume.uuid).run();
+        break;
+    case VolumeState::Unmounting:
+        Sqlite::Query(database, "UPDATE volume SET state = 1 WHERE uuid = ?1 AND state = 3").bind(1, volume.uuid).run();
+        break;
+    case VolumeState::Removing:
+        Sqlite::Query(database, "DELETE FROM volume WHERE uuid = ?1 AND state = 4").bind(1, volume.uuid).run();
+        break;
+    case VolumeState::Mounted:
+    case VolumeState::Unmounted:
+        break;
+    }
+}
+
+bool isMounted(VolumeState state) {
+    return state == VolumeState::Mounted || state == VolumeState::Mounting;
+}
+
+void put(Sqlite::Database &database, Volume const &volume) {
+    if (isMounted(volume.state)) {
+        Sqlite::Query taken(
+            database, "SELECT v.uuid FROM volume v JOIN file_system f ON f.id = v.file_system "
+                      "WHERE f.container_id = ?1 AND v.directory_name = ?2 AND v.state IN (0, 2) AND v.uuid <> ?3");
+        if (taken.bind(1, volume.containerId).bind(2, volume.directoryName).bind(3, volume.uuid).step()) {
+            throw Wire::Failure(Wire::ErrorCode::AlreadyExists, "The directory name \"" + volume.directoryName +
+                                                                    "\" is taken: the config volume " + taken.text(0) +
+                                                                    " is mounted under it");
+        }
+    }
+    Sqlite::Query(database, "INSERT INTO volume (uuid, file_system, directory_name, state) "
+                            "SELECT ?1, id, ?3, ?4 FROM file_system WHERE container_id = ?2 "
+                            "ON CONFLICT (uuid) DO UPDATE SET file_system = excluded.file_system, "
+                            "directory_name = excluded.directory_name, state = excluded.state")
+        .bind(1, volume.uuid)
+        .bind(2, volume.containerId)
+        .bind(3, volume.directoryName)
+        .bind(4, static_cast<int64_t>(volume.state))
+        .run();
+    if (database.changes() == 0) {
+        throw Wire::Failure(Wire::ErrorCode::NoSuchContainer,
+                            "The storage container " + volume.containerId + " is not mounted on this host");
+    }
+}
+
+} // namespace
+
+std::vector<Mount> HostStore::mounts() {
+    return translated([this] {
+        std::vector<Mount> mounts;
+        Sqlite::Database *const database = reader();
+        if (database == nullptr) {
+            return mounts;
+        }
+        Sqlite::Query row(*database,
+                          "SELECT v.uuid, f.container_id, v.directory_name FROM volume v "
+                          "JOIN file_system f ON f.id = v.file_system WHERE v.state IN (0, 2) ORDER BY v.id");
+        while (row.step()) {
+            mounts.push_back({row.text(0), row.text(1), row.text(2)});
+        }
+        return mounts;
+    });
+}
+
+std::optional<Volume> HostStore::volume(std::string_view uuid) {
+    return translated([&]() -> std::optional<Volume> {
+        Sqlite::Database *const database = reader();
+        if (database == nullptr) {
+            return std::nullopt;
+        }
+        Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM volume v "
+                                       "JOIN file_system f ON f.id = v.file_system WHERE v.uuid = ?1");
+        return readOne(query.bind(1, uuid));
+    });
+}
+
+std::optional<Volume> HostStore::mountedVolume(std::string_view containerId, std::string_view directoryName) {
+    return translated([&]() -> std::optional<Volume> {
+        Sqlite::Database *const database = reader();
+        if (database == nullptr) {
+            return std::nullopt;
+        }
+        Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM file_system f "
+                                       "JOIN volume v ON v.file_system = f.id AND v.state IN (0, 2) "
+                                       "WHERE f.container_id = ?1 AND v.directory_name = ?2");
+        return readOne(query.bind(1, containerId).bind(2, directoryName));
+    });
+}
+
+std::vector<Volume> HostStore::unmountedVolumes(std::string_view containerId, std::string_view directoryName) {
+    return translated([&] {
+        Sqlite::Database *const database = reader();
+        if (database == nullptr) {
+            return std::vector<Volume>();
+        }
+        Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM file_system f "
+                                       "JOIN volume v ON v.file_system = f.id AND v.state IN (1, 3, 4) "
+                                       "WHERE f.container_id = ?1 AND v.directory_name = ?2 ORDER BY v.id");
+        return readAll(query.bind(1, containerId).bind(2, directoryName));
+    });
+}
+
+std::vector<Volume> HostStore::unsettledVolumes() {
+    return translated([this] {
+        Sqlite::Database *const database = reader();
+        if (database == nullptr) {
+            return std::vector<Volume>();
+        }
+        Sqlite::Query query(*database,
+                            "SELECT v.uuid, f.container_id, v.directory_name, v.state "
+                            "FROM volume v INDEXED BY volume_unsettled JOIN file_system f ON f.id = v.file_system "
+                            "WHERE v.state IN (2, 3, 4) ORDER BY v.id");
+        return readAll(query);
+    });
+}
+
+void HostStore::putVolumes(std::vector<Volume> const &volumes, std::vector<Volume> const &settled) {
+    if (volumes.empty() && settled.empty()) {
+        return;
+    }
+    translated([&] {
+        Sqlite::Database &database = writer();
+        Sqlite::Transaction transaction(database);
+        for (Volume const &volume : settled) {
+            settle(database, volume);
+        }
+        for (Volume const &volume : volumes) {
+            put(database, volume);
+        }
+        transaction.commit();
+    });
+}
+
+} // namespace Store
