@@ -1,0 +1,186 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "plexa/OptionParser.h"
+
+#include <charconv>
+#include <utility>
+
+#include <boost/algorithm/string/predicate.hpp>
+
+#include "plexa/UsageError.h"
+
+namespace Plexa {
+
+namespace {
+
+using CallSpec::ParameterSpec;
+
+int64_t toNumber(std::string const &option, std::string const &value) {
+    int64_t number = 0;
+    char const *const end = value.data() + value.size();
+    auto const [position, error] = std::from_chars(value.data(), end, number);
+    if (error == std::errc::result_out_of_range && position == end) {
+        throw UsageError(option + ": " + quoted(value) +
+                         " is out of range, a whole number from -9223372036854775808 to 9223372036854775807 is "
+                         "expected");
+    }
+    if (error != std::errc() || position != end) {
+        throw UsageError(option + ": " + quoted(value) + " is not a number, a whole number is expected");
+    }
+    return number;
+}
+
+bool toTruth(std::string const &option, std::string const &value) {
+    if (boost::algorithm::iequals(value, "true", std::locale::classic())) {
+        return true;
+    }
+    if (boost::algorithm::iequals(value, "false", std::locale::classic())) {
+        return false;
+    }
+    throw UsageError(option + ": " + quoted(value) + " is not a boolean, true or false is expected");
+}
+
+bool isList(CallSpec::ParameterType type) {
+    return type == CallSpec::StringList || type == CallSpec::IntList || type == CallSpec::BoolList;
+}
+
+char const *expectation(CallSpec::ParameterType type) {
+    switch (type) {
+    case CallSpec::Int:
+    case CallSpec::IntList:
+        return "a whole number";
+    case CallSpec::Bool:
+    case CallSpec::BoolList:
+        return "true or false";
+    default:
+        return "a text";
+    }
+}
+
+} // namespace
+
+OptionParser::OptionParser(std::vector<Group> groups) {
+    for (Group const &group : groups) {
+        for (auto const &parameter : group.spec->GetParameters()) {
+            Target target;
+            target.parameter = parameter;
+            target.input = group.input;
+            targets_.push_back(std::move(target));
+        }
+    }
+}
+
+bool OptionParser::looksLikeOption(std::string const &word) {
+    return word.size() > 1 && word[0] == '-';
+}
+
+bool OptionParser::knows(std::string const &word) const {
+    return find(std::string_view(word).substr(0, word.find('='))) != nullptr;
+}
+
+void OptionParser::take(std::vector<std::string> const &words, std::size_t &position) {
+    std::string const &word = words[position];
+    bool const isLong = word.starts_with("--");
+    std::size_t const equals = isLong ? word.find('=') : std::string::npos;
+    std::string const option = word.substr(0, equals);
+    Target *const target = find(option);
+    if (target == nullptr) {
+        failUnknown(option);
+    }
+    CallSpec::ParameterType const type = target->parameter->GetType();
+    std::string const name = target->parameter->GetName();
+    if (target->given && !isList(type)) {
+        throw UsageError("--" + name + " is given twice");
+    }
+    ++position;
+    if (type == CallSpec::Flag) {
+        if (equals != std::string::npos) {
+            throw UsageError("--" + name + " takes no value, " + quoted(word.substr(equals + 1)) + " was given");
+        }
+        target->given = true;
+        target->input->SetFlag(name);
+        return;
+    }
+    if (equals == std::string::npos && position == words.size()) {
+        throw UsageError("--" + name + " needs a value, " + expectation(type) + " is expected");
+    }
+    std::string const value = equals != std::string::npos ? word.substr(equals + 1) : words[position++];
+    target->given = true;
+    switch (type) {
+    case CallSpec::String:
+        target->input->SetString(name, value);
+        break;
+    case CallSpec::Int:
+        target->input->SetInt(name, toNumber("--" + name, value));
+        break;
+    case CallSpec::Bool:
+        target->input->SetBool(name, toTruth("--" + name, value));
+        break;
+    case CallSpec::StringList:
+        target->texts.push_back(value);
+        break;
+    case CallSpec::IntList:
+        target->numbers.push_back(toNumber("--" + name, value));
+        break;
+    case CallSpec::BoolList:
+        target->truths.push_back(toTruth("--" + name, value));
+        break;
+    case CallSpec::Flag:
+        break;
+    }
+}
+
+void OptionParser::finish() {
+    for (Target &target : targets_) {
+        std::string const name = target.parameter->GetName();
+        CallSpec::ParameterType const type = target.parameter->GetType();
+        if (!target.given) {
+            continue;
+        }
+        if (type == CallSpec::StringList) {
+            target.input->SetStringList(name, target.texts);
+        } else if (type == CallSpec::IntList) {
+            target.input->SetIntList(name, target.numbers);
+        } else if (type == CallSpec::BoolList) {
+            target.input->SetBoolList(name, target.truths);
+        }
+    }
+}
+
+void OptionParser::requireAll(Group const &group) {
+    std::string missing;
+    std::size_t count = 0;
+    for (auto const &parameter : group.spec->GetParameters()) {
+        if (parameter->IsRequired() && !group.input->HasParameter(parameter->GetName())) {
+            missing += (count == 0 ? "--" : ", --") + parameter->GetName();
+            ++count;
+        }
+    }
+    if (count > 0) {
+        throw UsageError((count == 1 ? "missing required parameter: " : "missing required parameters: ") + missing);
+    }
+}
+
+OptionParser::Target const *OptionParser::find(std::string_view option) const {
+    bool const isLong = option.starts_with("--");
+    std::string_view const name = option.substr(isLong ? 2 : 1);
+    for (Target const &target : targets_) {
+        if (!name.empty() && name == (isLong ? target.parameter->GetName() : target.parameter->GetAlias())) {
+            return &target;
+        }
+    }
+    return nullptr;
+}
+
+OptionParser::Target *OptionParser::find(std::string_view option) {
+    return const_cast<Target *>(std::as_const(*this).find(option));
+}
+
+void OptionParser::failUnknown(std::string const &option) const {
+    std::vector<std::string> names;
+    for (Target const &target : targets_) {
+        names.push_back("--" + target.parameter->GetName());
+    }
+    throw UsageError("unknown option " + quoted(option) + didYouMean(nearNames(option, names)));
+}
+
+} // namespace Plexa

@@ -1,0 +1,103 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Formats.h"
+#include "ResultModel.h"
+#include "TextBuffer.h"
+#include "plexa/Text.h"
+
+namespace Plexa {
+
+using namespace MetaObj;
+
+namespace {
+
+constexpr std::size_t step = 2;
+
+class SimpleWriter {
+public:
+    SimpleWriter(FormatSettings const &settings, Sink &sink)
+        : settings_(settings)
+        , out_(sink) {}
+
+    void value(Object const &value, Object const &schema, std::size_t indent) {
+        switch (kindOf(value, schema)) {
+        case Kind::Nothing:
+            break;
+        case Kind::Scalar:
+        case Kind::Number:
+            if (isSet(value)) {
+                out_.print("{:{}}{}\n", "", indent, escaped(scalarText(value)));
+            }
+            break;
+        case Kind::ScalarList:
+        case Kind::StructList:
+            elements(value, schema, indent);
+            break;
+        case Kind::Struct:
+            structure(value, schema, indent);
+            break;
+        }
+    }
+
+private:
+    void elements(Object const &list, Object const &schema, std::size_t indent) {
+        auto const made = boost::dynamic_pointer_cast<MetaList>(list);
+        if (made == nullptr) {
+            return;
+        }
+        Object const element = elementSchema(list, schema);
+        bool first = true;
+        for (Object const &each : made->GetElements()) {
+            // A heading sets a nested structure off from the one before; without one, or outermost, a blank line does.
+            auto const asStruct = boost::dynamic_pointer_cast<MetaStruct>(each);
+            if (asStruct != nullptr && !first && (indent == 0 || settings_.header(*asStruct).empty())) {
+                out_.print("\n");
+            }
+            value(each, element, indent);
+            first = false;
+        }
+    }
+
+    void structure(Object const &object, Object const &schema, std::size_t indent) {
+        auto const made = boost::dynamic_pointer_cast<MetaStruct>(object);
+        if (made == nullptr) {
+            return;
+        }
+        std::string const header = settings_.header(*made);
+        if (!header.empty()) {
+            out_.print("{:{}}{}\n", "", indent, escaped(header));
+            indent += step;
+        }
+        std::vector<FieldView> fields = fieldsOf(object, schema);
+        if (auto const names = settings_.fields(made->GetName())) {
+            fields = selected(fields, *names);
+        }
+        for (FieldView const &each : fields) {
+            if (isSet(each.value)) {
+                field(each, made->GetName(), indent);
+            }
+        }
+    }
+
+    void field(FieldView const &field, std::string const &structureName, std::size_t indent) {
+        Kind const kind = kindOf(field.value, field.schema);
+        if (kind == Kind::Scalar || kind == Kind::Number) {
+            std::string const unit = settings_.unit(structureName, field.name);
+            out_.print("{:{}}{}: {}{}{}\n", "", indent, escaped(field.name), escaped(scalarText(field.value)),
+                       unit.empty() ? "" : " ", escaped(unit));
+        } else {
+            out_.print("{:{}}{}:\n", "", indent, escaped(field.name));
+            value(field.value, field.schema, indent + step);
+        }
+    }
+
+    FormatSettings const &settings_;
+    TextBuffer out_;
+};
+
+} // namespace
+
+void writeSimple(Result const &result, FormatSettings const &settings, Sink &sink) {
+    SimpleWriter(settings, sink).value(result.value, result.schema, 0);
+}
+
+} // namespace Plexa
