@@ -5,8 +5,10 @@
 #include <utility>
 
 #include <SQLiteCpp/SQLiteCpp.h>
+#include <fcntl.h>
 #include <sqlite3.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include "Explain.h"
 #include "Header.h"
@@ -22,6 +24,13 @@ int whyNotOpen(std::string const &path) {
         return errno;
     }
     return S_ISDIR(status.st_mode) ? EISDIR : S_ISREG(status.st_mode) ? 0 : EINVAL;
+}
+
+/// True also when there is no such directory.
+bool mayMakeFileBeside(std::string const &path) {
+    auto const slash = path.rfind('/');
+    std::string const directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
+    return ::faccessat(AT_FDCWD, directory.c_str(), W_OK | X_OK, AT_EACCESS) == 0 || errno == ENOENT;
 }
 
 bool exists(char const *path) {
@@ -68,6 +77,10 @@ void Database::open(Options const &options) {
         int const reason = whyNotOpen(path_);
         if (reason == ENOENT && mode_ != Mode::Create) {
             throw Error(ErrorKind::Missing, named(identity_.kindName, path_) + " does not exist");
+        }
+        if (reason == ENOENT && !mayMakeFileBeside(path_)) {
+            throw Error(ErrorKind::ReadOnly, named(identity_.kindName, path_) +
+                                                 " cannot be made: its directory or its file system is read-only");
         }
         throw explain(cause.getExtendedErrorCode(), reason, cause.what(), named(identity_.kindName, path_),
                       busyTimeout_);

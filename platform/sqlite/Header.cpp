@@ -39,11 +39,13 @@ Header readHeader(sqlite3 *handle, bool journalExists) {
     if (file->pMethods->xFileSize(file, &size) != SQLITE_OK) {
         return header;
     }
+    Bytes bytes{};
     if (size == 0) {
-        header.kind = Header::Kind::Empty;
+        // SQLite calls a file of one byte empty, too; that byte is somebody's.
+        bool const oneByte = file->pMethods->xRead(file, bytes.data(), 1, 0) == SQLITE_OK;
+        header.kind = oneByte ? Header::Kind::Garbage : Header::Kind::Empty;
         return header;
     }
-    Bytes bytes{};
     if (file->pMethods->xRead(file, bytes.data(), static_cast<int>(bytes.size()), 0) != SQLITE_OK) {
         return header;
     }

@@ -1,0 +1,190 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// Damage, locks, full disks and killed writers.
+#include "Fixture.h"
+
+#include <chrono>
+#include <filesystem>
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "sqlite/Transaction.h"
+
+namespace {
+
+using Sqlite::Database;
+using Sqlite::ErrorKind;
+using Sqlite::Mode;
+using Sqlite::Transaction;
+
+class FaultTest : public SqliteTest {
+protected:
+    /// Leaves a file of 20 rows whose next transaction was killed after parts of it had reached the file.
+    void leaveHotJournal() {
+        makeFile("a.db", 20);
+        runAndKill([&] {
+            static Database database(at("a.db"), kind(), Mode::ReadWrite);
+            database.execute("PRAGMA cache_size=1; BEGIN IMMEDIATE; UPDATE item SET text = zeroblob(0) || id || text;"
+                             "DELETE FROM item WHERE id > 3");
+        });
+        ASSERT_FALSE(bytesOf(at("a.db-journal")).empty());
+    }
+};
+
+TEST_F(FaultTest, fault_48_FlippedBytesAreNamedAndNothingIsOverwritten) {
+    std::string bytes = bytesOf(makeFile("a.db", 50));
+    for (std::size_t i = 4096; i < bytes.size(); ++i) {
+        bytes[i] = static_cast<char>(~bytes[i]);
+    }
+    writeBytes(at("a.db"), bytes);
+    Database database(at("a.db"), kind(), Mode::ReadWrite);
+    auto const read = errorOf([&] { countItems(database); });
+    ASSERT_TRUE(read);
+    EXPECT_EQ(read->kind(), ErrorKind::Malformed);
+    EXPECT_NE(read->sentence().find(at("a.db")), std::string::npos);
+    auto const written = errorOf([&] { database.query("INSERT INTO item (text) VALUES ('x')").run(); });
+    ASSERT_TRUE(written);
+    EXPECT_EQ(written->kind(), ErrorKind::Malformed);
+    EXPECT_EQ(bytesOf(at("a.db")), bytes);
+}
+
+TEST_F(FaultTest, fault_48_ACutFileIsNamed) {
+    std::string const bytes = bytesOf(makeFile("a.db", 50));
+    writeBytes(at("a.db"), bytes.substr(0, 8192));
+    auto const error = errorOf([&] {
+        Database database(at("a.db"), kind(), Mode::ReadWrite);
+        countItems(database);
+    });
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::Malformed) << error->sentence();
+}
+
+TEST_F(FaultTest, fault_48_AnIntegrityCheckFindsWhatNobodyReadYet) {
+    makeFile("a.db", 50);
+    Database(at("a.db"), kind(), Mode::QueryOnly).checkIntegrity();
+    std::string bytes = bytesOf(at("a.db"));
+    bytes.replace(bytes.size() - 4096, 64, std::string(64, '\x7f'));
+    writeBytes(at("a.db"), bytes);
+    Database database(at("a.db"), kind(), Mode::QueryOnly);
+    EXPECT_EQ(errorOf([&] { database.checkIntegrity(); })->kind(), ErrorKind::Malformed);
+}
+
+TEST_F(FaultTest, fault_49_BusyAfterTheTimeout) {
+    Database holder(makeFile("a.db"), kind(), Mode::ReadWrite);
+    Transaction const held(holder);
+    Database waiter(at("a.db"), kind(), Mode::ReadWrite, {std::chrono::milliseconds{60}});
+    auto const begin = std::chrono::steady_clock::now();
+    auto const error = errorOf([&] { Transaction transaction(waiter); });
+    auto const waited = std::chrono::steady_clock::now() - begin;
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::Busy);
+    EXPECT_EQ(error->sentence(), "The test file \"" + at("a.db") +
+                                     "\" is busy: another process has held its lock for 60 ms; nothing was changed, "
+                                     "try again");
+    EXPECT_GE(waited, std::chrono::milliseconds{50});
+    EXPECT_EQ(countItems(waiter), 1);
+}
+
+TEST_F(FaultTest, fault_49_AnEventLoopNeverWaits) {
+    Database holder(makeFile("a.db"), kind(), Mode::ReadWrite);
+    Database reader(at("a.db"), kind(), Mode::QueryOnly, {std::chrono::milliseconds{0}});
+    holder.execute("BEGIN EXCLUSIVE");
+    auto const error = errorOf([&] { countItems(reader); });
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::Busy);
+    EXPECT_EQ(error->sentence(), "The test file \"" + at("a.db") + "\" is busy: another process is changing it");
+    holder.execute("ROLLBACK");
+    EXPECT_EQ(countItems(reader), 1);
+}
+
+TEST_F(FaultTest, fault_49_ACommitThatMeetsAReaderRollsBack) {
+    Database reader(makeFile("a.db"), kind(), Mode::QueryOnly);
+    Database writer(at("a.db"), kind(), Mode::ReadWrite, {std::chrono::milliseconds{0}});
+    {
+        Transaction const reading(reader, Transaction::Kind::Read);
+        ASSERT_EQ(countItems(reader), 1);
+        auto const error = errorOf([&] {
+            Transaction transaction(writer);
+            writer.query("DELETE FROM item").run();
+            transaction.commit();
+        });
+        ASSERT_TRUE(error);
+        EXPECT_EQ(error->kind(), ErrorKind::Busy);
+    }
+    EXPECT_EQ(countItems(writer), 1);
+    writer.query("DELETE FROM item").run();
+    EXPECT_EQ(countItems(reader), 0);
+}
+
+TEST_F(FaultTest, fault_46_AFullDiskRollsBackAndReadsGoOn) {
+    Database database(makeFile("a.db", 5), kind(), Mode::ReadWrite);
+    database.execute("PRAGMA max_page_count=3");
+    auto const error = errorOf([&] {
+        Transaction transaction(database);
+        for (int i = 0; i < 100; ++i) {
+            database.query("INSERT INTO item (text) VALUES (?1)").bind(1, std::string(500, 'y')).run();
+        }
+        transaction.commit();
+    });
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::DiskFull);
+    EXPECT_EQ(countItems(database), 5);
+    database.query("DELETE FROM item WHERE id = 1").run();
+    EXPECT_EQ(countItems(database), 4);
+}
+
+TEST_F(FaultTest, fault_50_AReadOnlyFileStillReads) {
+    makeFile("a.db", 2);
+    ASSERT_EQ(::chmod(at("a.db").c_str(), 0444), 0);
+    ASSERT_EQ(::chmod(directory_.c_str(), 0555), 0);
+    // Root may write everything; become somebody else for a while.
+    bool const root = ::geteuid() == 0;
+    ASSERT_TRUE(!root || ::seteuid(65534) == 0);
+    for (Mode const mode : {Mode::Create, Mode::ReadWrite, Mode::QueryOnly}) {
+        std::optional<Sqlite::Error> error;
+        EXPECT_NO_THROW({
+            Database database(at("a.db"), kind(), mode);
+            EXPECT_EQ(countItems(database), 2);
+            EXPECT_TRUE(database.isReadOnly());
+            error = errorOf([&] { database.query("DELETE FROM item").run(); });
+        });
+        ASSERT_TRUE(error);
+        EXPECT_EQ(error->kind(), ErrorKind::ReadOnly) << error->sentence();
+    }
+    auto const made = errorOf([&] { Database(at("b.db"), kind(), Mode::Create); });
+    ASSERT_TRUE(!root || ::seteuid(0) == 0);
+    ::chmod(directory_.c_str(), 0755);
+    ASSERT_TRUE(made);
+    EXPECT_EQ(made->kind(), ErrorKind::ReadOnly) << made->sentence();
+}
+
+TEST_F(FaultTest, fault_52_AReaderRollsAKilledWriterBack) {
+    leaveHotJournal();
+    Database database(at("a.db"), kind(), Mode::QueryOnly);
+    EXPECT_EQ(countItems(database), 20);
+    Sqlite::Query lengths(database, "SELECT count(*) FROM item WHERE length(text) = 500");
+    lengths.step();
+    EXPECT_EQ(lengths.integer(0), 20);
+    EXPECT_FALSE(exists(at("a.db-journal")));
+}
+
+TEST_F(FaultTest, fault_52_AWriterRollsAKilledWriterBack) {
+    leaveHotJournal();
+    Database database(at("a.db"), kind(), Mode::Create);
+    database.query("INSERT INTO item (text) VALUES ('after')").run();
+    EXPECT_EQ(countItems(database), 21);
+    database.checkIntegrity();
+}
+
+TEST_F(FaultTest, fault_27_AFileThatWasKilledWhileBeingMadeIsMadeAgain) {
+    auto big = kind();
+    big.schema += "CREATE TABLE filler (a BLOB) STRICT; PRAGMA cache_size=1; INSERT INTO filler VALUES "
+                  "(zeroblob(200000)); SELECT load_extension('no such')";
+    EXPECT_TRUE(errorOf([&] { Database(at("a.db"), big, Mode::Create); }));
+    EXPECT_EQ(errorOf([&] { Database(at("a.db"), kind(), Mode::QueryOnly); })->kind(), ErrorKind::Missing);
+    Database database(at("a.db"), kind(), Mode::Create);
+    EXPECT_EQ(countItems(database), 0);
+}
+
+} // namespace
