@@ -1,0 +1,53 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Arena.h"
+
+#include <algorithm>
+#include <cstdint>
+#include <cstring>
+
+namespace LumoClient {
+
+namespace {
+
+constexpr std::size_t leastBlock = 512;
+constexpr std::size_t largestBlock = std::size_t{1} << 20;
+/// The next block is this part of what there is.
+constexpr std::size_t growth = 8;
+
+} // namespace
+
+Arena::~Arena() {
+    while (newest_ != nullptr) {
+        Block *block = newest_;
+        newest_ = block->previous;
+        ::operator delete(block);
+    }
+}
+
+void *Arena::allocate(std::size_t bytes, std::size_t alignment) {
+    std::size_t const gap = (alignment - reinterpret_cast<std::uintptr_t>(next_) % alignment) % alignment;
+    if (next_ == nullptr || gap > left_ || bytes > left_ - gap) {
+        std::size_t const size =
+            std::max(sizeof(Block) + bytes + alignment, std::clamp(total_ / growth, leastBlock, largestBlock));
+        newest_ = new (::operator new(size)) Block{newest_};
+        next_ = reinterpret_cast<std::byte *>(newest_) + sizeof(Block);
+        left_ = size - sizeof(Block);
+        total_ += size;
+        return allocate(bytes, alignment);
+    }
+    std::byte *result = next_ + gap;
+    next_ = result + bytes;
+    left_ -= gap + bytes;
+    return result;
+}
+
+char const *Arena::copy(capnp::Text::Reader text) {
+    if (text.size() == 0) {
+        return "";
+    }
+    void *place = allocate(text.size() + 1, 1);
+    std::memcpy(place, text.cStr(), text.size() + 1);
+    return static_cast<char const *>(place);
+}
+
+} // namespace LumoClient

@@ -1,0 +1,57 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cstddef>
+#include <new>
+#include <type_traits>
+
+#include <capnp/blob.h>
+
+namespace LumoClient {
+
+/// Memory of one result: records and texts of any number in a few blocks, given back at once. Blocks grow with what is
+/// already there, by an eighth, so that little is ever left over (the standard's monotonic resource doubles).
+class Arena {
+public:
+    Arena() = default;
+    ~Arena();
+    Arena(Arena const &) = delete;
+    Arena &operator=(Arena const &) = delete;
+
+    /// @throw std::bad_alloc
+    void *allocate(std::size_t bytes, std::size_t alignment);
+
+    /// Records, all zero. They have nothing to destroy.
+    template <typename Record>
+    Record *records(std::size_t count) {
+        static_assert(std::is_trivially_destructible_v<Record> && std::is_trivially_copyable_v<Record>);
+        return new (allocate(count * sizeof(Record), alignof(Record))) Record[count]();
+    }
+
+    /// A NUL-terminated copy.
+    char const *copy(capnp::Text::Reader text);
+
+private:
+    struct Block {
+        Block *previous;
+    };
+
+    Block *newest_ = nullptr;
+    std::byte *next_ = nullptr;
+    std::size_t left_ = 0;
+    std::size_t total_ = 0;
+};
+
+/// A result of the C interface together with the memory that it points into. The caller sees the Result; its free
+/// function gets it back and deletes the whole.
+template <typename Result>
+struct Owned : Result {
+    Owned()
+        : Result() {}
+    static void free(Result *result) {
+        delete static_cast<Owned *>(result);
+    }
+    Arena arena;
+};
+
+} // namespace LumoClient

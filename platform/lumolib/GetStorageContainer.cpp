@@ -1,0 +1,25 @@
+// SPDX-License-Identifier: Apache-2.0
+#include <memory>
+
+#include "Session.h"
+#include "StorageRecords.h"
+
+using namespace LumoClient;
+
+LumoErrorEx LumoLib_GetStorageContainer(int32_t, void const *, StorageContainerResult **result) {
+    return answerEx([result](Connection &connection) {
+        requireOut(result);
+        auto owned = std::make_unique<Owned<StorageContainerResult>>();
+        StorageRecords records(owned->arena, connection);
+        connection.request(
+            Repeat::Always, connection.deadline(),
+            [](Wire::Request::Builder request) { request.setGetStorageContainer(); },
+            [&records](Wire::Reply::Reader reply) { records.take(reply); });
+        records.finish(*owned);
+        *result = owned.release();
+    });
+}
+
+void LumoLib_FreeStorageContainerResult(StorageContainerResult *result) {
+    Owned<StorageContainerResult>::free(result);
+}

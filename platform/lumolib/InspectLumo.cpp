@@ -1,0 +1,149 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// What the daemon knows about one volume: sizes, storage profile, unshared chunks, metadata.
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+#include <new>
+
+#include "Arena.h"
+#include "Session.h"
+
+using namespace LumoClient;
+
+namespace {
+
+/// The one-reply answer to a question about a volume.
+template <typename Init, typename Take>
+void inspect(Connection &connection, char const *containerId, char const *uuid, Init init, Take take) {
+    std::string const canonical = canonicalContainerId(containerId);
+    connection.request(
+        Repeat::Always, connection.deadline(),
+        [&](Wire::Request::Builder request) {
+            Wire::VolumeKey::Builder key = init(request);
+            key.setContainerId(textOf(canonical));
+            key.setUuid(argument(uuid));
+        },
+        [&](Wire::Reply::Reader reply) { take(reply); });
+}
+
+void requireKind(Connection const &connection, bool right, char const *kind) {
+    if (!right) {
+        throw connection.unexpected(std::string("it answered something else than ") + kind);
+    }
+}
+
+void requireNotNegative(Connection const &connection, std::int64_t size, char const *what) {
+    if (size < 0) {
+        throw connection.unexpected(std::string(what) + " is negative");
+    }
+}
+
+} // namespace
+
+int32_t LumoLib_SpaceStatsForLumo(char const *containerId, char const *uuid, LumoSpaceStats **stats) {
+    return answer([=](Connection &connection) {
+        requireOut(stats);
+        auto owned = std::make_unique<LumoSpaceStats>();
+        inspect(
+            connection, containerId, uuid,
+            [](Wire::Request::Builder request) { return request.initSpaceStatsForLumo(); },
+            [&](Wire::Reply::Reader reply) {
+                requireKind(connection, reply.isSpaceStats(), "space statistics");
+                Wire::SpaceStats::Reader const answered = reply.getSpaceStats();
+                owned->logicalSize = answered.getLogicalSizeMb();
+                owned->committedSize = answered.getCommittedSizeMb();
+                owned->unsharedSize = answered.getUnsharedSizeMb();
+                owned->unsharedSizeValid = answered.getUnsharedSizeValid() ? 1 : 0;
+            });
+        requireNotNegative(connection, owned->logicalSize, "the logical size");
+        requireNotNegative(connection, owned->committedSize, "the committed size");
+        if (owned->unsharedSizeValid != 0) {
+            requireNotNegative(connection, owned->unsharedSize, "the unshared size");
+        }
+        *stats = owned.release();
+    });
+}
+
+void LumoLib_FreeLumoSpaceStatsInfo(LumoSpaceStats *stats) {
+    delete stats;
+}
+
+int32_t LumoLib_GetLumoInfo(char const *containerId, char const *uuid, LumoInfo **info) {
+    return answer([=](Connection &connection) {
+        requireOut(info);
+        auto owned = std::make_unique<Owned<LumoInfo>>();
+        inspect(
+            connection, containerId, uuid, [](Wire::Request::Builder request) { return request.initGetLumoInfo(); },
+            [&](Wire::Reply::Reader reply) {
+                requireKind(connection, reply.isLumoInfo(), "volume information");
+                Wire::LumoInfo::Reader const answered = reply.getLumoInfo();
+                if (answered.hasStorageProfile()) {
+                    owned->storageProfile = owned->arena.copy(answered.getStorageProfile());
+                }
+            });
+        *info = owned.release();
+    });
+}
+
+void LumoLib_FreeLumoInfo(LumoInfo *info) {
+    Owned<LumoInfo>::free(info);
+}
+
+int32_t LumoLib_UnsharedChunksLumo(char const *containerId, char const *uuid, int, int, int, int, int,
+                                   LumoUnsharedChunks **chunks) {
+    return answer([=](Connection &connection) {
+        requireOut(chunks);
+        // One block, because the caller releases it with free().
+        std::unique_ptr<LumoUnsharedChunks, decltype(&std::free)> block(nullptr, &std::free);
+        inspect(
+            connection, containerId, uuid,
+            [](Wire::Request::Builder request) { return request.initUnsharedChunksLumo(); },
+            [&](Wire::Reply::Reader reply) {
+                requireKind(connection, reply.isUnsharedChunks(), "unshared chunks");
+                Wire::UnsharedChunks::Reader const answered = reply.getUnsharedChunks();
+                capnp::Data::Reader const bitmap = answered.getBitmap();
+                void *room = std::malloc(sizeof(LumoUnsharedChunks) + bitmap.size());
+                if (room == nullptr) {
+                    throw std::bad_alloc();
+                }
+                block.reset(new (room) LumoUnsharedChunks{answered.getBlockSize(),
+                                                          static_cast<std::int64_t>(bitmap.size()) * 8});
+                if (bitmap.size() > 0) {
+                    std::memcpy(block.get() + 1, bitmap.begin(), bitmap.size());
+                }
+            });
+        requireNotNegative(connection, block->blockSize, "the block size");
+        *chunks = block.release();
+    });
+}
+
+int32_t LumoLib_GetLumoMetadata(char const *containerId, char const *uuid, LumoMetadata **metadata) {
+    return answer([=](Connection &connection) {
+        requireOut(metadata);
+        auto owned = std::make_unique<Owned<LumoMetadata>>();
+        LumoMetadataEntry **end = &owned->first;
+        inspect(
+            connection, containerId, uuid, [](Wire::Request::Builder request) { return request.initGetLumoMetadata(); },
+            [&](Wire::Reply::Reader reply) {
+                requireKind(connection, reply.isMetadata() || reply.isDone(), "metadata");
+                if (reply.isDone()) {
+                    return;
+                }
+                capnp::List<Wire::MetadataPair>::Reader const pairs = reply.getMetadata();
+                connection.requireChunk(pairs.size());
+                for (Wire::MetadataPair::Reader const pair : pairs) {
+                    LumoMetadataEntry *entry = owned->arena.records<LumoMetadataEntry>(1);
+                    entry->key = owned->arena.copy(pair.getKey());
+                    entry->value = owned->arena.copy(pair.getValue());
+                    *end = entry;
+                    end = &entry->next;
+                }
+            });
+        *metadata = owned.release();
+    });
+}
+
+void LumoLib_FreeLumoMetadata(LumoMetadata *metadata) {
+    Owned<LumoMetadata>::free(metadata);
+}
