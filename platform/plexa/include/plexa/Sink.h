@@ -10,8 +10,13 @@ namespace Plexa {
 class Sink {
 public:
     virtual ~Sink() = default;
-    /// Takes the text as it is. A sink that cannot says so later, in its own way; writing on is harmless.
+    /// Takes the text as it is. Never throws; what could not be written is told by problem(), and writing on is
+    /// harmless.
     virtual void write(std::string_view text) = 0;
+    /// Why not everything written has arrived; empty while it has.
+    virtual std::string problem() const {
+        return {};
+    }
 };
 
 /// Keeps what is written: the twin for tests.

@@ -1,0 +1,88 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "PlatformLibraries.h"
+
+#include <dlfcn.h>
+#include <string_view>
+#include <utility>
+
+#include "lumolib/LastFailure.h"
+
+namespace Tovicli {
+
+namespace {
+
+constexpr char const *framework = "libplexa.so.1"; // linked to this program
+constexpr char const *daemonClient = "liblumo.so.1";
+constexpr char const *hostControl = "libkestrel.so.1"; // itself needs the daemon's client
+
+/// Which name of ours another version of a library is told from; null for a library that is not the platform's.
+char const *ourVersionOf(std::string_view needed) {
+    for (char const *ours : {framework, daemonClient, hostControl}) {
+        std::string_view const unversioned(ours, std::string_view(ours).size() - 2);
+        if (needed.substr(0, unversioned.size()) == unversioned &&
+            (needed.size() == unversioned.size() || needed[unversioned.size()] == '.')) {
+            return ours;
+        }
+    }
+    return nullptr;
+}
+
+} // namespace
+
+PlatformLibraries::PlatformLibraries(std::string directory)
+    : directory_(std::move(directory)) {}
+
+std::string PlatformLibraries::provide(std::vector<std::string> const &needed) {
+    bool needsClient = false;
+    bool needsHost = false;
+    for (std::string const &name : needed) {
+        char const *const ours = ourVersionOf(name);
+        if (ours != nullptr && name != ours) {
+            return "it was built against " + name + ", this tool has " + ours;
+        }
+        needsHost = needsHost || name == hostControl;
+        needsClient = needsClient || name == daemonClient || name == hostControl;
+    }
+    std::string problem = needsClient ? load(daemonClient) : std::string();
+    return problem.empty() && needsHost ? load(hostControl) : problem;
+}
+
+std::string PlatformLibraries::load(std::string const &name) {
+    if (loaded_.contains(name)) {
+        return {};
+    }
+    void *library = dlopen(name.c_str(), RTLD_LAZY | RTLD_NOLOAD);
+    if (library == nullptr) {
+        library = dlopen((directory_ + "/" + name).c_str(), RTLD_LAZY | RTLD_LOCAL);
+    }
+    if (library == nullptr) {
+        char const *const text = dlerror();
+        return "it needs " + name + ", which cannot be loaded: " + (text != nullptr ? text : "unknown error");
+    }
+    loaded_[name] = library;
+    return {};
+}
+
+void *PlatformLibraries::functionOf(char const *name) const {
+    auto const client = loaded_.find(daemonClient);
+    return client != loaded_.end() ? dlsym(client->second, name) : nullptr;
+}
+
+std::optional<LastFailure> PlatformLibraries::lastFailure() const {
+    auto const ask = reinterpret_cast<decltype(&LumoPlatform_LastFailure)>(functionOf("LumoPlatform_LastFailure"));
+    LumoLastFailure noted{};
+    if (ask == nullptr || !ask(&noted)) {
+        return std::nullopt;
+    }
+    return LastFailure{noted.code, noted.sentence, noted.requestId};
+}
+
+void PlatformLibraries::clearLastFailure() const {
+    auto const clear =
+        reinterpret_cast<decltype(&LumoPlatform_ClearLastFailure)>(functionOf("LumoPlatform_ClearLastFailure"));
+    if (clear != nullptr) {
+        clear();
+    }
+}
+
+} // namespace Tovicli

@@ -1,0 +1,126 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "PluginLoader.h"
+
+#include <dlfcn.h>
+#include <exception>
+#include <utility>
+
+#include "ElfFile.h"
+#include "kestrel/Lib.h"
+
+namespace Tovicli {
+
+namespace {
+
+std::string loaderText() {
+    char const *text = dlerror();
+    return text != nullptr ? text : "unknown error";
+}
+
+/// Calls an entry point. @return why it failed, empty when it did not
+template <typename Call>
+std::string reasonOf(Call const &call) {
+    try {
+        call();
+        return {};
+    } catch (std::exception const &failure) {
+        return failure.what();
+    } catch (...) {
+        return "an exception of an unknown kind";
+    }
+}
+
+} // namespace
+
+PluginLoader::PluginLoader(std::string libraryDirectory, uid_t user)
+    : platform_(std::move(libraryDirectory))
+    , user_(user) {}
+
+Registration PluginLoader::registerInto(boost::shared_ptr<Plexa::AutoCli::Namespace> &root,
+                                        std::string const &directory, Environment &environment) {
+    Directory &loaded = load(directory);
+    Registration registration;
+    registration.troubles = loaded.troubles;
+    for (Plugin const &plugin : loaded.plugins) {
+        registerPlugin(plugin, root, environment, registration);
+    }
+    return registration;
+}
+
+PluginLoader::Directory &PluginLoader::load(std::string const &path) {
+    auto const [position, isNew] = directories_.try_emplace(path);
+    Directory &loaded = position->second;
+    if (!isNew) {
+        return loaded;
+    }
+    PluginDirectory opened = openPluginDirectory(path, user_);
+    if (!opened.problem.empty()) {
+        loaded.troubles.push_back("plug-in directory '" + path + "' not used: " + opened.problem);
+        return loaded;
+    }
+    loaded.troubles = std::move(opened.skipped);
+    for (PluginFile &file : opened.files) {
+        Plugin plugin;
+        plugin.file = std::move(file);
+        if (std::string const problem = loadPlugin(plugin); !problem.empty()) {
+            loaded.troubles.push_back("plug-in '" + plugin.file.name + "' skipped: " + problem);
+            skipped_.push_back(std::move(plugin.file.descriptor));
+        } else {
+            loaded.plugins.push_back(std::move(plugin));
+        }
+    }
+    return loaded;
+}
+
+std::string PluginLoader::loadPlugin(Plugin &plugin) {
+    int const descriptor = plugin.file.descriptor.number();
+    ElfFile const elf = readElfFile(descriptor);
+    if (!elf.problem.empty()) {
+        return elf.problem;
+    }
+    if (std::string const problem = platform_.provide(elf.needed); !problem.empty()) {
+        return problem;
+    }
+    std::string const path = "/proc/self/fd/" + std::to_string(descriptor);
+    void *const library = dlopen(path.c_str(), RTLD_LAZY | RTLD_LOCAL);
+    if (library == nullptr) {
+        return loaderText();
+    }
+    void *const entry = dlsym(library, "AutoCli_RegisterNamespaces");
+    if (entry == nullptr) {
+        return "it has no entry point AutoCli_RegisterNamespaces";
+    }
+    plugin.entry = reinterpret_cast<EntryPoint>(entry);
+    return {};
+}
+
+void PluginLoader::registerPlugin(Plugin const &plugin, boost::shared_ptr<Plexa::AutoCli::Namespace> &root,
+                                  Environment &environment, Registration &registration) {
+    std::string reason = reasonOf([&] {
+        try {
+            plugin.entry(root);
+        } catch (Kestrel::Lib::KestrelException const &) {
+            // No daemon session. Offline, sessions open without a daemon; what was registered so far is found again.
+            if (environment.get("TOVI_OFFLINE")) {
+                throw;
+            }
+            registration.daemonMissing = true;
+            registration.daemonFailure = lastFailure();
+            environment.set("TOVI_OFFLINE", "1");
+            plugin.entry(root);
+        }
+    });
+    if (!reason.empty()) {
+        registration.troubles.push_back("plug-in '" + plugin.file.name + "' failed: " + reason);
+    }
+}
+
+std::optional<LastFailure> PluginLoader::lastFailure() {
+    return platform_.lastFailure();
+}
+
+void PluginLoader::clearLastFailure() {
+    platform_.clearLastFailure();
+}
+
+} // namespace Tovicli

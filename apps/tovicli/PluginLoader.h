@@ -1,0 +1,55 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <map>
+#include <string>
+#include <sys/types.h>
+#include <vector>
+
+#include "PlatformLibraries.h"
+#include "PluginDirectory.h"
+#include "PluginSource.h"
+
+namespace Tovicli {
+
+/// Loads the plug-ins of a directory into this process and calls their entry points. What is loaded stays loaded: the
+/// tree holds objects whose code is there.
+class PluginLoader : public PluginSource {
+public:
+    /// @param libraryDirectory where the platform's libraries lie
+    /// @param user             who may own plug-ins besides root
+    PluginLoader(std::string libraryDirectory, uid_t user);
+
+    Registration registerInto(boost::shared_ptr<Plexa::AutoCli::Namespace> &root, std::string const &directory,
+                              Environment &environment) override;
+    std::optional<LastFailure> lastFailure() override;
+    void clearLastFailure() override;
+
+private:
+    using EntryPoint = void (*)(boost::shared_ptr<Plexa::AutoCli::Namespace> &root);
+
+    /// The descriptor stays open: the loader knows a library by the path /proc/self/fd/N, and a number that is used
+    /// again would name the earlier library.
+    struct Plugin {
+        PluginFile file;
+        EntryPoint entry = nullptr;
+    };
+    struct Directory {
+        std::vector<Plugin> plugins;
+        std::vector<std::string> troubles;
+    };
+
+    Directory &load(std::string const &path);
+    /// @return why the file is not used; empty when its entry point is at hand
+    std::string loadPlugin(Plugin &plugin);
+    void registerPlugin(Plugin const &plugin, boost::shared_ptr<Plexa::AutoCli::Namespace> &root,
+                        Environment &environment, Registration &registration);
+
+    PlatformLibraries platform_;
+    uid_t user_;
+    std::map<std::string, Directory> directories_;
+    /// Of files that were looked at in vain; one of them may be loaded all the same.
+    std::vector<Descriptor> skipped_;
+};
+
+} // namespace Tovicli

@@ -1,0 +1,74 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// One run of the tool, from words to exit status, without touching the process it runs in: output, environment,
+// plug-ins and chance come through the context, so that a test runs the tool whole.
+#pragma once
+
+#include <cstddef>
+#include <functional>
+#include <string>
+#include <vector>
+
+#include "Call.h"
+#include "CommandLine.h"
+#include "ErrorReport.h"
+#include "ExitStatus.h"
+#include "PluginSource.h"
+#include "Settings.h"
+#include "plexa/FormatSettings.h"
+#include "plexa/Formatter.h"
+
+namespace Tovicli {
+
+/// What a run meets outside itself. Everything referred to must outlive the run.
+struct Context {
+    Plexa::Sink &output;
+    Plexa::Sink &errors;
+    Environment &environment;
+    PluginSource &plugins;
+    std::function<std::string()> newRequestId;
+    Defaults defaults;
+    /// Columns of the terminal that help is read on.
+    std::size_t width = 80;
+    /// Runs with more rights than its caller has: what the caller put into the environment does not count.
+    bool privileged = false;
+};
+
+class Tool {
+public:
+    explicit Tool(Context &context);
+
+    /// @param arguments as main gets them, the program's name first
+    ExitStatus run(std::vector<std::string> const &arguments);
+
+private:
+    using Root = boost::shared_ptr<Plexa::AutoCli::Namespace>;
+
+    ExitStatus runWords(std::vector<std::string> const &words);
+    ExitStatus misread(Misread const &mistake);
+    ExitStatus showHelp(Plexa::AutoCli::NamespaceNode &node);
+    ExitStatus showVersion();
+    ExitStatus runCommand(Plexa::AutoCli::Command &command, CommandLine const &line);
+    void tell(Outcome const &outcome);
+    ExitStatus written(ExitStatus status, std::string const &whatWasDone);
+
+    /// Makes the settings hold: for the platform's libraries through the environment.
+    void apply(Settings const &settings);
+    /// A fresh tree with every plug-in's subtree under these settings.
+    Root grow(Settings const &settings);
+    Plexa::FormatSettings formatSettings(Plexa::AutoCli::Command &command,
+                                         boost::shared_ptr<Plexa::MetaObj::MetaObject> const &schema) const;
+    std::string socketPath() const;
+    std::string startHint() const;
+    /// Why no daemon was to be had when the plug-ins were registered, with its socket's path; one line.
+    std::string daemonSentence() const;
+
+    Context &context_;
+    ErrorReport report_;
+    Settings settings_;
+    Registration registration_;
+    std::string requestId_;
+    bool offlineByUser_ = false;
+};
+
+} // namespace Tovicli

@@ -1,0 +1,106 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// The process around a run of the tool: descriptors, signals, where it lies, whom it serves.
+#include <cerrno>
+#include <climits>
+#include <csignal>
+#include <cstdio>
+#include <fcntl.h>
+#include <string>
+#include <sys/auxv.h>
+#include <sys/ioctl.h>
+#include <sys/random.h>
+#include <unistd.h>
+#include <vector>
+
+#include "DescriptorSink.h"
+#include "PluginLoader.h"
+#include "Tool.h"
+
+namespace {
+
+/// A file opened later must not take the place of a standard stream that the caller closed: what is written to the
+/// stream would end up in it. The stand-ins fail every use, so that a closed output is still reported.
+void occupyStandardDescriptors() {
+    for (int const descriptor : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+        if (fcntl(descriptor, F_GETFD) == -1 && errno == EBADF) {
+            int const opened = open("/dev/null", descriptor == STDIN_FILENO ? O_WRONLY : O_RDONLY);
+            if (opened != descriptor) {
+                _exit(static_cast<int>(Tovicli::ExitStatus::Unwritten));
+            }
+        }
+    }
+}
+
+extern "C" void endInterrupted(int) {
+    constexpr char text[] = "tovicli: interrupted\n";
+    ssize_t const written = write(STDERR_FILENO, text, sizeof(text) - 1);
+    static_cast<void>(written); // nobody is left to be told
+    _exit(static_cast<int>(Tovicli::ExitStatus::Interrupted));
+}
+
+void arrangeSignals() {
+    struct sigaction action {};
+    action.sa_handler = SIG_IGN;
+    sigaction(SIGPIPE, &action, nullptr);
+    struct sigaction before {};
+    sigaction(SIGINT, nullptr, &before);
+    if (before.sa_handler != SIG_IGN) { // a background job keeps ignoring it
+        action.sa_handler = endInterrupted;
+        sigaction(SIGINT, &action, nullptr);
+    }
+}
+
+std::string directoryAbove(std::string const &path) {
+    std::size_t const slash = path.rfind('/');
+    return slash == std::string::npos || slash == 0 ? "/" : path.substr(0, slash);
+}
+
+std::string programDirectory() {
+    char path[PATH_MAX];
+    ssize_t const length = readlink("/proc/self/exe", path, sizeof(path));
+    return length > 0 ? directoryAbove(std::string(path, static_cast<std::size_t>(length))) : "/usr/bin";
+}
+
+std::string workingDirectory() {
+    char path[PATH_MAX];
+    return getcwd(path, sizeof(path)) != nullptr ? path : "/";
+}
+
+/// 32 hexadecimal digits.
+std::string randomRequestId() {
+    unsigned char bytes[16] = {};
+    if (getrandom(bytes, sizeof(bytes), 0) != static_cast<ssize_t>(sizeof(bytes))) {
+        return "process-" + std::to_string(getpid());
+    }
+    constexpr char const *digits = "0123456789abcdef";
+    std::string id;
+    for (unsigned char const byte : bytes) {
+        id += digits[byte >> 4];
+        id += digits[byte & 0xF];
+    }
+    return id;
+}
+
+std::size_t terminalWidth() {
+    winsize size{};
+    bool const isTerminal = ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0;
+    return isTerminal && size.ws_col > 0 ? size.ws_col : 80;
+}
+
+} // namespace
+
+int main(int argc, char **argv) {
+    occupyStandardDescriptors();
+    arrangeSignals();
+    std::string const installed = directoryAbove(programDirectory());
+    Tovicli::DescriptorSink output(STDOUT_FILENO);
+    Tovicli::DescriptorSink errors(STDERR_FILENO);
+    Tovicli::ProcessEnvironment environment;
+    Tovicli::PluginLoader plugins(installed + "/lib", geteuid());
+    Tovicli::Context context{output,          errors,
+                             environment,     plugins,
+                             randomRequestId, {installed + "/lib/tovicli/plugins", workingDirectory()},
+                             terminalWidth(), getauxval(AT_SECURE) != 0};
+    return static_cast<int>(Tovicli::Tool(context).run(std::vector<std::string>(argv, argv + argc)));
+}
