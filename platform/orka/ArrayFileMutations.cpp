@@ -81,6 +81,10 @@ void insertVolume(Sqlite::Database &database, VolumeSpec const &spec, ContainerR
         insert.bind(6, *spec.profile);
     }
     insert.run();
+    if (spec.kind == VolumeKind::Config) {
+        auto pair = database.query("INSERT INTO metadata (volume, position, key, value) VALUES (?, 0, ?, ?)");
+        pair.bind(1, database.lastInsertId()).bind(2, directoryNameKey).bind(3, spec.directoryName).run();
+    }
 }
 
 /// The volume as it was when it was made, whatever became of it since.

@@ -127,9 +127,6 @@ Metadata ArrayFile::metadata(std::string const &containerId, std::string const &
         Metadata pairs;
         Sqlite::Transaction transaction(*database_, Sqlite::Transaction::Kind::Read);
         auto const found = requireVolume(*database_, containerId, uuid);
-        if (!found.volume.directoryName.empty()) {
-            pairs.push_back({directoryNameKey, found.volume.directoryName});
-        }
         auto rows = database_->query("SELECT key, value FROM metadata WHERE volume = ? ORDER BY position");
         rows.bind(1, found.seq);
         while (rows.step()) {

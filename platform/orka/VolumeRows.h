@@ -10,7 +10,7 @@
 
 namespace Orka {
 
-/// The key under which a volume's directory name stands in its metadata.
+/// The key under which a new config volume's directory name becomes its first metadata pair.
 inline constexpr char const *directoryNameKey = "directoryName";
 
 /// A container's row. @throws Wire::Failure NoSuchContainer

@@ -6,8 +6,8 @@
 // Called by the embedded provider inside the daemon and by the array simulator. Every method is one transaction: a
 // mutation is durable when it returns and has not happened when it throws. Methods block on the disk, and on another
 // process's lock no longer than the busy timeout. An object belongs to one thread; several processes may have the file
-// open. Everything throws Wire::Failure: File*, DiskFull and IoError for the file, FileBusy when the timeout passed,
-// and what a method names.
+// open. Everything throws Wire::Failure: NoSuchContainer where a container is named, File*, DiskFull and IoError for
+// the file, FileBusy when the timeout passed, and what a method names.
 #pragma once
 
 #include <chrono>

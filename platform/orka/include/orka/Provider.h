@@ -11,10 +11,10 @@
 // promise that is dropped cancels what has not begun; a mutation may have taken place nevertheless. Promises may
 // outlive the provider, but not the timer that it was made with.
 //
-// Failures to expect from every operation: ProviderUnreachable (with where and why), ProviderBusy (the deadline came
-// while the array was locked), DeadlineExceeded, File* for an array file that is not what it should be,
-// InvalidArgument, InternalError. Those of a single operation are named with it. A provider that failed is asked again
-// as it is: it recovers by itself.
+// Failures to expect from every operation: NoSuchContainer where one is named, ProviderUnreachable (with where and
+// why), ProviderBusy (the deadline came while the array was locked), DeadlineExceeded, File* for an array file that is
+// not what it should be, InvalidArgument, InternalError. Those of a single operation are named with it. A provider that
+// failed is asked again as it is: it recovers by itself.
 //
 // Idempotency: a mutation that carries a key takes effect once, however often it is repeated with the same key; each
 // repetition that succeeds gives the first one's answer. What failed has had no effect and is tried anew. A key that
@@ -106,7 +106,7 @@ public:
     virtual Answer<UnsharedChunks> unsharedChunksVirtualVolume(CallContext context, std::string containerId,
                                                                std::string uuid) = 0;
 
-    /// A volume's metadata in order; the directory name comes first, under the key "directoryName", if there is one.
+    /// A volume's metadata in order. A config volume is made with one pair: its directory name under "directoryName".
     /// Failures: NoSuchVolume.
     virtual Answer<Metadata> getMetadata(CallContext context, std::string containerId, std::string uuid) = 0;
 

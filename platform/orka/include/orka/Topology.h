@@ -14,7 +14,7 @@ namespace Orka {
 
 struct TopologyVolume {
     VirtualVolume volume;
-    Metadata metadata; ///< without the directory name, which the array adds
+    Metadata metadata;
 
     bool operator==(TopologyVolume const &) const = default;
 };
