@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Directory.h"
+#include "store/Directory.h"
 
 #include <cerrno>
 #include <system_error>

@@ -41,6 +41,15 @@ std::optional<FileSystem> find(Sqlite::Database *database, char const *sql, std:
                                          " config volumes are mounted in it, the first is \"" + first + '"');
 }
 
+void refuseMounts(Sqlite::Database &database, std::string_view containerId) {
+    Sqlite::Query used(database, "SELECT f.name, v.directory_name, count(*) OVER () FROM file_system f "
+                                 "JOIN volume v ON v.file_system = f.id AND v.state IN (0, 2) "
+                                 "WHERE f.container_id = ?1 ORDER BY v.id LIMIT 1");
+    if (used.bind(1, containerId).step()) {
+        refuseInUse(used.text(0), used.integer(2), used.text(1));
+    }
+}
+
 } // namespace
 
 std::vector<FileSystem> HostStore::fileSystems() {
@@ -124,6 +133,14 @@ void HostStore::addFileSystem(FileSystem const &fileSystem) {
     });
 }
 
+void HostStore::requireNoMounts(std::string_view containerId) {
+    translated([&] {
+        if (Sqlite::Database *const database = reader(); database != nullptr) {
+            refuseMounts(*database, containerId);
+        }
+    });
+}
+
 bool HostStore::removeFileSystem(std::string_view containerId) {
     return translated([&] {
         if (reader() == nullptr) {
@@ -131,14 +148,7 @@ bool HostStore::removeFileSystem(std::string_view containerId) {
         }
         Sqlite::Database &database = writer();
         Sqlite::Transaction transaction(database);
-        Sqlite::Query used(database,
-                           "SELECT f.name, v.directory_name, count(*) OVER () FROM file_system f "
-                           "JOIN volume v ON v.file_system = f.id AND v.state IN (0, 2) WHERE f.container_id = ?1 "
-                           "ORDER BY v.id LIMIT 1");
-        if (used.bind(1, containerId).step()) {
-            refuseInUse(used.text(0), used.integer(2), used.text(1));
-        }
-        used.reset();
+        refuseMounts(database, containerId);
         Sqlite::Query(database, "DELETE FROM file_system WHERE container_id = ?1").bind(1, containerId).run();
         bool const removed = database.changes() != 0;
         if (removed) {

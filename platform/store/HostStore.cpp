@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "store/HostStore.h"
 
-#include "Directory.h"
 #include "Schema.h"
 #include "Translate.h"
 #include "sqlite/Database.h"
+#include "store/Directory.h"
 #include "wire/Paths.h"
 
 namespace Store {

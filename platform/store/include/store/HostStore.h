@@ -92,6 +92,8 @@ public:
     std::optional<FileSystem> fileSystemNamed(std::string_view name);
     /// Fails with AlreadyExists when the name or the container is there, saying which.
     void addFileSystem(FileSystem const &fileSystem);
+    /// Fails with InUse while config volumes are mounted in that container, naming how many and the first.
+    void requireNoMounts(std::string_view containerId);
     /// Fails with InUse while config volumes are mounted in it, naming how many and the first. Forgets its unmounted
     /// ones.
     /// @return false when there was none.

@@ -1,0 +1,201 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "ConfigVolumes.h"
+
+#include <utility>
+
+#include "Names.h"
+#include "VolumeDirectories.h"
+
+namespace Kestrel {
+namespace {
+
+bool isMounted(Store::Volume const &volume) {
+    return volume.state == Store::VolumeState::Mounted || volume.state == Store::VolumeState::Mounting;
+}
+
+bool isGone(Wire::Failure const &failure) {
+    return failure.code() == Wire::ErrorCode::NoSuchVolume || failure.code() == Wire::ErrorCode::NoSuchContainer;
+}
+
+Store::Volume inState(Store::Volume volume, Store::VolumeState state) {
+    volume.state = state;
+    return volume;
+}
+
+} // namespace
+
+ConfigVolumes::ConfigVolumes(Host &host, std::string containerName, std::string containerId,
+                             LumoClient::Channel channel)
+    : host_(host)
+    , containerName_(std::move(containerName))
+    , containerId_(std::move(containerId))
+    , channel_(channel) {}
+
+LumoClient::VolumeKey ConfigVolumes::keyOf(std::string const &name, std::string const &uuid) const {
+    if (!uuid.empty()) {
+        return {containerId_, requireVolumeUuid(uuid), {}};
+    }
+    requireDirectoryName(name, "directory name");
+    return {containerId_, {}, name};
+}
+
+std::optional<Store::Volume> ConfigVolumes::recordOf(LumoClient::VolumeKey const &key) {
+    if (key.uuid.empty()) {
+        return host_.store.mountedVolume(containerId_, key.directoryName);
+    }
+    auto record = host_.store.volume(key.uuid);
+    return record && record->containerId == containerId_ ? record : std::nullopt;
+}
+
+Store::Volume ConfigVolumes::requireMounted(LumoClient::VolumeKey const &key) {
+    auto record = recordOf(key);
+    if (!record || !isMounted(*record)) {
+        throw Wire::Failure(Wire::ErrorCode::NoSuchVolume,
+                            key.uuid.empty()
+                                ? "No config volume named \"" + key.directoryName +
+                                      "\" is mounted in the storage container \"" + containerName_ + '"'
+                                : "The config volume " + key.uuid + " is not mounted in the storage container \"" +
+                                      containerName_ + '"');
+    }
+    return *record;
+}
+
+void ConfigVolumes::mount(std::string const &name, std::string const &uuid) {
+    LumoClient::Volume const bound = host_.client.bindVirtualVolume(keyOf(name, uuid), channel_);
+    bool mountedBefore = false;
+    try {
+        place(bound, mountedBefore);
+    } catch (Wire::Failure const &) {
+        if (!mountedBefore) {
+            unbindQuietly(bound.uuid);
+        }
+        throw;
+    }
+}
+
+void ConfigVolumes::place(LumoClient::Volume const &bound, bool &mountedBefore) {
+    // What a provider calls its volumes becomes part of a path here.
+    requireDirectoryName(bound.uuid, "volume uuid");
+    requireDirectoryName(bound.directoryName, "directory name");
+    VolumeDirectories directories(host_);
+    auto const settled = directories.finishUnsettled();
+    if (auto const record = host_.store.volume(bound.uuid); record && isMounted(*record)) {
+        mountedBefore = true;
+        throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
+                            "The config volume \"" + record->directoryName + "\" (" + record->uuid +
+                                ") is mounted already in the storage container \"" + containerName_ + '"');
+    }
+    Store::Volume const volume{bound.uuid, containerId_, bound.directoryName, Store::VolumeState::Mounting};
+    directories.prepareMount(volume, containerName_);
+    host_.store.putVolumes({volume}, settled);
+    try {
+        directories.bringOut(volume, containerName_);
+    } catch (Wire::Failure const &) {
+        host_.store.putVolumes({inState(volume, Store::VolumeState::Unmounted)}, {});
+        throw;
+    }
+}
+
+void ConfigVolumes::unmount(std::string const &name, std::string const &uuid) {
+    LumoClient::VolumeKey const key = keyOf(name, uuid);
+    std::vector<Store::Volume> settled;
+    Store::Volume volume;
+    {
+        VolumeDirectories directories(host_);
+        settled = directories.finishUnsettled();
+        volume = requireMounted(key);
+    }
+    try {
+        // Not under the lock: an answer may take as long as the timeout.
+        host_.client.unbindVirtualVolume({containerId_, volume.uuid, {}}, channel_);
+    } catch (Wire::Failure const &failure) {
+        if (!isGone(failure)) {
+            throw;
+        }
+        // Deleted behind this host's back: there is nothing to unbind, and no reason to keep the mount.
+    }
+    try {
+        VolumeDirectories directories(host_);
+        volume = requireMounted({containerId_, volume.uuid, {}});
+        host_.store.putVolumes({inState(volume, Store::VolumeState::Unmounting)}, settled);
+        try {
+            directories.putAway(volume, containerName_);
+        } catch (Wire::Failure const &) {
+            host_.store.putVolumes({inState(volume, Store::VolumeState::Mounted)}, {});
+            throw;
+        }
+    } catch (Wire::Failure const &failure) {
+        if (failure.code() != Wire::ErrorCode::NoSuchVolume) {
+            bindQuietly(volume.uuid); // it stays mounted
+        }
+        throw;
+    }
+}
+
+void ConfigVolumes::remove(std::string const &name, std::string const &uuid) {
+    LumoClient::VolumeKey key = keyOf(name, uuid);
+    std::optional<Store::Volume> record;
+    {
+        VolumeDirectories directories(host_);
+        directories.finishUnsettled();
+        record = recordOf(key);
+    }
+    if (record) {
+        // What is mounted here under the name is what its user means.
+        key = {containerId_, record->uuid, {}};
+    }
+    std::vector<Store::Volume> gone;
+    try {
+        gone.push_back({host_.client.deleteVirtualVolume(key, channel_).uuid, containerId_, {}, {}});
+    } catch (Wire::Failure const &failure) {
+        // A removal that was killed half-way, or a volume deleted elsewhere: its record and content are still here.
+        if (failure.code() != Wire::ErrorCode::NoSuchVolume) {
+            throw;
+        }
+        gone = record             ? std::vector<Store::Volume>{*record}
+               : key.uuid.empty() ? host_.store.unmountedVolumes(containerId_, key.directoryName)
+                                  : std::vector<Store::Volume>();
+        if (gone.empty()) {
+            throw;
+        }
+    }
+    for (Store::Volume const &volume : gone) {
+        forget(volume);
+    }
+}
+
+void ConfigVolumes::forget(Store::Volume const &volume) {
+    try {
+        requireDirectoryName(volume.uuid, "volume uuid");
+        VolumeDirectories directories(host_);
+        auto const settled = directories.finishUnsettled();
+        if (auto const record = host_.store.volume(volume.uuid); record) {
+            host_.store.putVolumes({inState(*record, Store::VolumeState::Removing)}, settled);
+            directories.putAway(*record, containerName_);
+        }
+        directories.discard(volume.uuid);
+    } catch (Wire::Failure const &failure) {
+        throw Wire::Failure(failure.code(),
+                            "The config volume is deleted on its array, but what it held on this host is "
+                            "not: " +
+                                failure.sentence());
+    }
+}
+
+void ConfigVolumes::bindQuietly(std::string const &uuid) {
+    try {
+        host_.client.bindVirtualVolume({containerId_, uuid, {}}, channel_);
+    } catch (Wire::Failure const &) {
+        // The failure that led here is the one to report.
+    }
+}
+
+void ConfigVolumes::unbindQuietly(std::string const &uuid) {
+    try {
+        host_.client.unbindVirtualVolume({containerId_, uuid, {}}, channel_);
+    } catch (Wire::Failure const &) {
+        // The failure that led here is the one to report.
+    }
+}
+
+} // namespace Kestrel

@@ -1,0 +1,41 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "Host.h"
+
+namespace Kestrel {
+
+/// Mounts, unmounts and removes the config volumes of one container. Each operation is one daemon round trip, one
+/// durable transaction and one rename. The daemon goes first: when it refuses, or is not there, nothing has changed
+/// here. A volume is named by its uuid or, when that is empty, by its directory name. Everything throws Wire::Failure.
+class ConfigVolumes {
+public:
+    ConfigVolumes(Host &host, std::string containerName, std::string containerId, LumoClient::Channel channel);
+
+    void mount(std::string const &name, std::string const &uuid);
+    void unmount(std::string const &name, std::string const &uuid);
+    /// Also finishes a removal that was cut off after the array had deleted the volume.
+    void remove(std::string const &name, std::string const &uuid);
+
+private:
+    LumoClient::VolumeKey keyOf(std::string const &name, std::string const &uuid) const;
+    /// The record of a volume of this container, mounted or not; by name only a mounted one.
+    std::optional<Store::Volume> recordOf(LumoClient::VolumeKey const &key);
+    Store::Volume requireMounted(LumoClient::VolumeKey const &key);
+    /// @param mountedBefore set when the volume turns out to be mounted already
+    void place(LumoClient::Volume const &bound, bool &mountedBefore);
+    void forget(Store::Volume const &volume);
+    void bindQuietly(std::string const &uuid);
+    void unbindQuietly(std::string const &uuid);
+
+    Host &host_;
+    std::string containerName_;
+    std::string containerId_;
+    LumoClient::Channel channel_;
+};
+
+} // namespace Kestrel

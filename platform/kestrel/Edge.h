@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <exception>
+#include <new>
+#include <string>
+
+#include "gantry/Lib.h"
+#include "lumolib/LastFailure.h"
+#include "wire/Failure.h"
+
+namespace Kestrel {
+
+/// Notes a failure for the tool and throws it as the interface promises.
+[[noreturn]] inline void failAtEdge(Wire::ErrorCode code, std::string const &sentence) {
+    LumoPlatform_NoteFailure(static_cast<int32_t>(code), sentence.c_str());
+    throw Gantry::Lib::GantryException(sentence, Gantry::Lib::QuibMessage());
+}
+
+/// The one place where failures of the store, the client and the file system become GantryExceptions: every operation
+/// of the interface runs in it.
+template <typename Operation>
+auto atEdge(Operation const &operation) {
+    try {
+        return operation();
+    } catch (Wire::Failure const &failure) {
+        failAtEdge(failure.code(), failure.sentence());
+    } catch (std::bad_alloc const &) {
+        failAtEdge(Wire::ErrorCode::OutOfMemory, "The host's storage configuration ran out of memory");
+    } catch (std::exception const &cause) {
+        failAtEdge(Wire::ErrorCode::InternalError,
+                   std::string("The host's storage configuration failed unexpectedly: ") + cause.what());
+    }
+}
+
+} // namespace Kestrel
