@@ -24,7 +24,7 @@ std::string unknownWordSentence(AutoCli::NamespaceNode &node, std::string const 
     std::string const path = node.GetPathString(' ');
     std::vector<std::string> const names = node.GetNamespaceNodeNames();
     std::string const near = didYouMean(nearNames(word, names));
-    return "unknown word " + quoted(word) + (path.empty() ? "" : " in '" + path + "'") +
+    return "unknown word " + shownWord(word) + (path.empty() ? "" : " in '" + path + "'") +
            (near.empty() ? whatThereIs(names) : near);
 }
 
@@ -33,7 +33,7 @@ std::string strayWordSentence(CallSpec::InputSpec const &spec, std::string const
     for (auto const &parameter : spec.GetParameters()) {
         names.push_back("--" + parameter->GetName());
     }
-    return "unexpected word " + quoted(word) + ", an option is expected" + didYouMean(nearNames("--" + word, names));
+    return "unexpected word " + shownWord(word) + ", an option is expected" + didYouMean(nearNames("--" + word, names));
 }
 
 /// Follows words and global options down to a command, or as far as they lead.

@@ -42,7 +42,7 @@ Descriptor openChecked(std::string const &canonical, uid_t user, std::string &pr
         struct stat status {};
         bool const isLast = begin >= canonical.size();
         if (fstat(directory.number(), &status) != 0) {
-            problem = "'" + shown + "': " + systemText(errno);
+            problem = systemText(errno);
             return Descriptor();
         }
         if (std::string const found = ownershipProblem(status, user, !isLast); !found.empty()) {
@@ -112,7 +112,7 @@ PluginDirectory openPluginDirectory(std::string const &path, uid_t user) {
     PluginDirectory opened;
     std::unique_ptr<char, decltype(&std::free)> const canonical(realpath(path.c_str(), nullptr), &std::free);
     if (canonical == nullptr) {
-        opened.problem = "'" + path + "': " + systemText(errno);
+        opened.problem = systemText(errno);
         return opened;
     }
     Descriptor const directory = openChecked(canonical.get(), user, opened.problem);

@@ -55,7 +55,7 @@ PluginLoader::Directory &PluginLoader::load(std::string const &path) {
     }
     PluginDirectory opened = openPluginDirectory(path, user_);
     if (!opened.problem.empty()) {
-        loaded.troubles.push_back("plug-in directory '" + path + "' not used: " + opened.problem);
+        loaded.troubles.push_back("no plug-ins from '" + path + "': " + opened.problem);
         return loaded;
     }
     loaded.troubles = std::move(opened.skipped);

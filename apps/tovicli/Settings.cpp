@@ -57,7 +57,7 @@ int64_t timeoutFrom(Source const &source, int64_t unitMs) {
     }
     std::optional<int64_t> const number = wholeNumber(text);
     if (!number || *number < 1 || *number > longestTimeoutMs / unitMs) {
-        throw UsageError(source.origin + ": " + quoted(source.value) + " is no timeout; " + timeoutForms);
+        throw UsageError(source.origin + ": " + shownWord(source.value) + " is no timeout; " + timeoutForms);
     }
     return *number * unitMs;
 }
@@ -81,7 +81,7 @@ std::optional<std::string> logLevel(CallSpec::Input const &options, Environment 
             return level;
         }
     }
-    throw UsageError(source->origin + ": " + quoted(source->value) +
+    throw UsageError(source->origin + ": " + shownWord(source->value) +
                      " is no log level; there is quiet, panic, error, warning, info, verbose, trivia");
 }
 

@@ -27,7 +27,7 @@ void checkWords(std::vector<std::string> const &words) {
                              " bytes, at most " + std::to_string(longestArgument) + " are taken");
         }
         if (!isValidUtf8(words[i])) {
-            throw UsageError("argument " + std::to_string(i + 1) + " is not valid UTF-8: " + quoted(words[i]));
+            throw UsageError("argument " + std::to_string(i + 1) + " is not valid UTF-8: " + shownWord(words[i]));
         }
     }
 }
@@ -147,7 +147,7 @@ ExitStatus Tool::misread(Misread const &mistake) {
         report_.warn(daemonSentence());
     }
     if (mistake.unknownWord && !registration_.troubles.empty()) {
-        report_.fail(mistake.sentence + "; it may belong to what could not be loaded");
+        report_.fail(mistake.sentence, std::nullopt, "a plug-in that could not be loaded may hold it");
         return ExitStatus::Unavailable;
     }
     std::string const path = mistake.node->GetPathString(' ');
@@ -166,9 +166,14 @@ ExitStatus Tool::showHelp(AutoCli::NamespaceNode &node) {
         report_.warn(daemonSentence());
     }
     auto *const command = dynamic_cast<AutoCli::Command *>(&node);
-    std::string const help = command != nullptr ? commandHelpText(*command, program, context_.width)
-                                                : namespaceHelp(node, program, context_.width);
-    context_.output.write(escaped(help + globalOptionsHelp(*globalOptions(), context_.width), Lines::Keep));
+    std::string help = command != nullptr ? commandHelpText(*command, program, context_.width)
+                                          : namespaceHelp(node, program, context_.width);
+    if (node.GetParent() == nullptr) {
+        help += globalOptionsHelp(*globalOptions(), context_.width);
+    } else {
+        help += std::string("\nGlobal options: ") + program + " --help\n";
+    }
+    context_.output.write(escaped(help, Lines::Keep));
     return written(ExitStatus::Completed, {});
 }
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "plexa/OptionParser.h"
 
+#include <algorithm>
 #include <charconv>
 #include <utility>
 
@@ -19,12 +20,12 @@ int64_t toNumber(std::string const &option, std::string const &value) {
     char const *const end = value.data() + value.size();
     auto const [position, error] = std::from_chars(value.data(), end, number);
     if (error == std::errc::result_out_of_range && position == end) {
-        throw UsageError(option + ": " + quoted(value) +
+        throw UsageError(option + ": " + shownWord(value) +
                          " is out of range, a whole number from -9223372036854775808 to 9223372036854775807 is "
                          "expected");
     }
     if (error != std::errc() || position != end) {
-        throw UsageError(option + ": " + quoted(value) + " is not a number, a whole number is expected");
+        throw UsageError(option + ": " + shownWord(value) + " is not a number, a whole number is expected");
     }
     return number;
 }
@@ -36,7 +37,7 @@ bool toTruth(std::string const &option, std::string const &value) {
     if (boost::algorithm::iequals(value, "false", std::locale::classic())) {
         return false;
     }
-    throw UsageError(option + ": " + quoted(value) + " is not a boolean, true or false is expected");
+    throw UsageError(option + ": " + shownWord(value) + " is not a boolean, true or false is expected");
 }
 
 bool isList(CallSpec::ParameterType type) {
@@ -94,7 +95,7 @@ void OptionParser::take(std::vector<std::string> const &words, std::size_t &posi
     ++position;
     if (type == CallSpec::Flag) {
         if (equals != std::string::npos) {
-            throw UsageError("--" + name + " takes no value, " + quoted(word.substr(equals + 1)) + " was given");
+            throw UsageError("--" + name + " takes no value, " + shownWord(word.substr(equals + 1)) + " was given");
         }
         target->given = true;
         target->input->SetFlag(name);
@@ -178,9 +179,14 @@ OptionParser::Target *OptionParser::find(std::string_view option) {
 void OptionParser::failUnknown(std::string const &option) const {
     std::vector<std::string> names;
     for (Target const &target : targets_) {
-        names.push_back("--" + target.parameter->GetName());
+        names.push_back(target.parameter->GetName());
     }
-    throw UsageError("unknown option " + quoted(option) + didYouMean(nearNames(option, names)));
+    std::string const bare = option.substr(std::min(option.find_first_not_of('-'), option.size()));
+    std::vector<std::string> near = nearNames(bare, names);
+    for (std::string &name : near) {
+        name.insert(0, "--");
+    }
+    throw UsageError("unknown option " + shownWord(option) + didYouMean(near));
 }
 
 } // namespace Plexa

@@ -47,7 +47,7 @@ bool beginsWith(std::string_view text, std::string_view beginning) {
 
 } // namespace
 
-std::string quoted(std::string_view word) {
+std::string shownWord(std::string_view word) {
     constexpr std::size_t longest = 120; // bytes; more of it would bury the sentence it stands in
     if (word.size() <= longest) {
         return "'" + escaped(word) + "'";

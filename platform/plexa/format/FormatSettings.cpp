@@ -53,7 +53,7 @@ void FormatSettings::setFromUser(std::string const &assignment) {
     bool const named = (key.starts_with("fields:") && key.size() > 7) || (key.starts_with("header:") && key.size() > 7);
     bool const unit = key.starts_with("units:") && key.find('.') != std::string::npos;
     if (equals == std::string::npos || !(named || unit || key == "table-columns")) {
-        throw UsageError("--format-param: " + quoted(assignment) +
+        throw UsageError("--format-param: " + shownWord(assignment) +
                          " is none of fields:<structure>=..., header:<structure>=..., table-columns=..., "
                          "units:<structure>.<field>=...");
     }
@@ -70,8 +70,8 @@ void FormatSettings::chooseFields(std::string const &structure, std::string cons
     for (std::string const &name : chosen) {
         if (std::find(declared.begin(), declared.end(), name) == declared.end()) {
             throw UsageError(declared.empty() ? "--fields: the result of this command has no fields"
-                                              : "--fields: " + quoted(name) + " is no field of the result; there is " +
-                                                    joined(declared));
+                                              : "--fields: " + shownWord(name) +
+                                                    " is no field of the result; there is " + joined(declared));
         }
     }
     chosen_ = chosen;

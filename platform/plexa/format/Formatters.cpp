@@ -37,7 +37,7 @@ std::string formatNames() {
 Format const &requireFormat(std::string const &name, std::string const &origin) {
     Format const *format = findFormat(name);
     if (format == nullptr) {
-        throw UsageError(origin + ": unknown format " + quoted(name) + "; there is " + formatNames());
+        throw UsageError(origin + ": unknown format " + shownWord(name) + "; there is " + formatNames());
     }
     return *format;
 }

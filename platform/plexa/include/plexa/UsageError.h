@@ -26,7 +26,7 @@ private:
 };
 
 /// A word of the user's between single quotes: escaped, and cut when it is too long to be read.
-std::string quoted(std::string_view word);
+std::string shownWord(std::string_view word);
 
 /// Names that are near a word that was mistyped, the nearest first, at most three.
 std::vector<std::string> nearNames(std::string_view word, std::vector<std::string> const &names);
