@@ -52,10 +52,10 @@ Store::Volume ConfigVolumes::requireMounted(LumoClient::VolumeKey const &key) {
     if (!record || !isMounted(*record)) {
         throw Wire::Failure(Wire::ErrorCode::NoSuchVolume,
                             key.uuid.empty()
-                                ? "No config volume named \"" + key.directoryName +
-                                      "\" is mounted in the storage container \"" + containerName_ + '"'
-                                : "The config volume " + key.uuid + " is not mounted in the storage container \"" +
-                                      containerName_ + '"');
+                                ? "no config volume named '" + key.directoryName +
+                                      "' is mounted in the storage container '" + containerName_ + '\''
+                                : "the config volume " + key.uuid + " is not mounted in the storage container '" +
+                                      containerName_ + '\'');
     }
     return *record;
 }
@@ -82,8 +82,8 @@ void ConfigVolumes::place(LumoClient::Volume const &bound, bool &mountedBefore) 
     if (auto const record = host_.store.volume(bound.uuid); record && isMounted(*record)) {
         mountedBefore = true;
         throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
-                            "The config volume \"" + record->directoryName + "\" (" + record->uuid +
-                                ") is mounted already in the storage container \"" + containerName_ + '"');
+                            "the config volume '" + record->directoryName + "' (" + record->uuid +
+                                ") is mounted already in the storage container '" + containerName_ + '\'');
     }
     Store::Volume const volume{bound.uuid, containerId_, bound.directoryName, Store::VolumeState::Mounting};
     directories.prepareMount(volume, containerName_);
@@ -176,7 +176,7 @@ void ConfigVolumes::forget(Store::Volume const &volume) {
         directories.discard(volume.uuid);
     } catch (Wire::Failure const &failure) {
         throw Wire::Failure(failure.code(),
-                            "The config volume is deleted on its array, but what it held on this host is "
+                            "the config volume is deleted on its array, but what it held on this host is "
                             "not: " +
                                 failure.sentence());
     }

@@ -13,20 +13,20 @@
 namespace Kestrel {
 
 DirectoryLock::DirectoryLock(Directory const &directory, std::chrono::milliseconds timeout)
-    : descriptor_(::openat(directory.descriptor.number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {
+    : descriptor_(::openat(directory.descriptor.get(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {
     if (!descriptor_) {
         failFor(directory.path, "locked", errno);
     }
     auto const deadline = std::chrono::steady_clock::now() + timeout;
     std::chrono::milliseconds pause{1};
     // flock has no timeout of its own; holders keep the lock for one transaction and one rename.
-    while (::flock(descriptor_.number(), LOCK_EX | LOCK_NB) != 0) {
+    while (::flock(descriptor_.get(), LOCK_EX | LOCK_NB) != 0) {
         if (errno != EWOULDBLOCK && errno != EINTR) {
             failFor(directory.path, "locked", errno);
         }
         if (std::chrono::steady_clock::now() >= deadline) {
-            throw Wire::Failure(Wire::ErrorCode::FileBusy, "The directory \"" + directory.path +
-                                                               "\" is busy: another process has held its lock for " +
+            throw Wire::Failure(Wire::ErrorCode::FileBusy, "the directory '" + directory.path +
+                                                               "' is busy: another process has held its lock for " +
                                                                std::to_string(timeout.count()) +
                                                                " ms; nothing was changed, try again");
         }

@@ -3,7 +3,7 @@
 
 #include <chrono>
 
-#include "Descriptor.h"
+#include "Directory.h"
 
 namespace Kestrel {
 
@@ -16,7 +16,7 @@ public:
     DirectoryLock(Directory const &directory, std::chrono::milliseconds timeout);
 
 private:
-    Descriptor descriptor_;
+    Wire::UniqueFd descriptor_;
 };
 
 } // namespace Kestrel

@@ -26,10 +26,10 @@ auto atEdge(Operation const &operation) {
     } catch (Wire::Failure const &failure) {
         failAtEdge(failure.code(), failure.sentence());
     } catch (std::bad_alloc const &) {
-        failAtEdge(Wire::ErrorCode::OutOfMemory, "The host's storage configuration ran out of memory");
+        failAtEdge(Wire::ErrorCode::OutOfMemory, "the host's storage configuration ran out of memory");
     } catch (std::exception const &cause) {
         failAtEdge(Wire::ErrorCode::InternalError,
-                   std::string("The host's storage configuration failed unexpectedly: ") + cause.what());
+                   std::string("the host's storage configuration failed unexpectedly: ") + cause.what());
     }
 }
 

@@ -52,7 +52,7 @@ void LumoFileSystem::CreateConfigLumo(std::string const &name, std::string const
         requireDirectoryName(name, "directory name");
         if (sizeMb < 0) {
             throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
-                                "The size of a config volume cannot be " + std::to_string(sizeMb) +
+                                "the size of a config volume cannot be " + std::to_string(sizeMb) +
                                     " MB: a positive number, or 0 for the default, is expected");
         }
         out = host_->client
@@ -69,7 +69,7 @@ void LumoFileSystem::RemoveConfigLumo(std::string const &name, std::string const
 void LumoFileSystem::ReservedConfigLumo(std::string const & /*first*/, std::string const & /*second*/,
                                         std::string const & /*extra*/, bool /*priority*/) {
     atEdge([] {
-        throw Wire::Failure(Wire::ErrorCode::UnknownMethod, "This host has no such operation on config volumes");
+        throw Wire::Failure(Wire::ErrorCode::UnknownMethod, "this host has no such operation on config volumes");
     });
 }
 

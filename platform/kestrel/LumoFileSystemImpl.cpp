@@ -21,7 +21,7 @@ void LumoFileSystemImpl::UnRegisterVendorProvider(std::string const &name) {
     onStore([&](Store::HostStore &store) {
         if (!store.removeProvider(name)) {
             throw Wire::Failure(Wire::ErrorCode::NoSuchProvider,
-                                "No Orka provider named \"" + name + "\" is registered on this host");
+                                "no Orka provider named '" + name + "' is registered on this host");
         }
     });
 }

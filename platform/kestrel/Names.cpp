@@ -12,7 +12,7 @@ namespace {
 constexpr std::size_t nameBytesMax = 255; // NAME_MAX of every file system that a root may lie on
 
 [[noreturn]] void refuse(std::string const &name, std::string const &what, std::string const &reason) {
-    throw Wire::Failure(Wire::ErrorCode::InvalidArgument, "The " + what + " \"" + name + "\" " + reason);
+    throw Wire::Failure(Wire::ErrorCode::InvalidArgument, "the " + what + " '" + name + "' " + reason);
 }
 
 bool isControl(boost::locale::utf::code_point point) {
@@ -35,7 +35,7 @@ void requirePrintableUtf8(std::string const &name, std::string const &what) {
 
 void requireDirectoryName(std::string const &name, std::string const &what) {
     if (name.empty()) {
-        throw Wire::Failure(Wire::ErrorCode::InvalidArgument, "The " + what + " is empty");
+        throw Wire::Failure(Wire::ErrorCode::InvalidArgument, "the " + what + " is empty");
     }
     if (name.size() > nameBytesMax) {
         refuse(name.substr(0, 40) + "...", what,
@@ -45,7 +45,7 @@ void requireDirectoryName(std::string const &name, std::string const &what) {
         refuse(name, what, "cannot name a directory");
     }
     if (name.find('/') != std::string::npos) {
-        refuse(name, what, "has a \"/\" in it: it must be a single directory name, not a path");
+        refuse(name, what, "has a '/' in it: it must be a single directory name, not a path");
     }
     requirePrintableUtf8(name, what);
 }
@@ -53,7 +53,7 @@ void requireDirectoryName(std::string const &name, std::string const &what) {
 void requireContainerName(std::string const &name) {
     requireDirectoryName(name, "storage container name");
     if (name.front() == '.') {
-        refuse(name, "storage container name", "begins with \".\": its directory would be hidden");
+        refuse(name, "storage container name", "begins with '.': its directory would be hidden");
     }
 }
 
@@ -61,7 +61,7 @@ std::string requireContainerId(std::string const &text) {
     auto canonical = Wire::normalizeContainerId(text);
     if (!canonical) {
         throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
-                            "\"" + text + "\" is no storage container id: a UUID of 32 hexadecimal digits is expected");
+                            "'" + text + "' is no storage container id: a UUID of 32 hexadecimal digits is expected");
     }
     return *canonical;
 }

@@ -4,7 +4,7 @@
 #include <optional>
 #include <string>
 
-#include "Descriptor.h"
+#include "Directory.h"
 
 namespace Kestrel {
 

@@ -17,7 +17,7 @@ namespace {
 using Listing = std::unique_ptr<DIR, int (*)(DIR *)>;
 
 Listing list(Directory const &directory) {
-    int const own = ::openat(directory.descriptor.number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    int const own = ::openat(directory.descriptor.get(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     Listing listing(own < 0 ? nullptr : ::fdopendir(own), ::closedir);
     if (!listing) {
         int const systemError = errno;
@@ -32,16 +32,16 @@ Listing list(Directory const &directory) {
 /// Its owner may have locked himself out; a tree that is to go is opened all the same. Through a descriptor, so that no
 /// link is followed.
 void allowOwner(Directory const &parent, std::string const &name) {
-    Descriptor const entry(
-        ::openat(parent.descriptor.number(), name.c_str(), O_PATH | O_NOFOLLOW | O_DIRECTORY | O_CLOEXEC));
+    Wire::UniqueFd const entry(
+        ::openat(parent.descriptor.get(), name.c_str(), O_PATH | O_NOFOLLOW | O_DIRECTORY | O_CLOEXEC));
     if (entry) {
-        ::chmod(("/proc/self/fd/" + std::to_string(entry.number())).c_str(), S_IRWXU);
+        ::chmod(("/proc/self/fd/" + std::to_string(entry.get())).c_str(), S_IRWXU);
     }
 }
 
 Directory openToEmpty(Directory const &parent, std::string const &name) {
     struct stat status {};
-    if (::fstatat(parent.descriptor.number(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
+    if (::fstatat(parent.descriptor.get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
         S_ISDIR(status.st_mode) && (status.st_mode & S_IRWXU) != S_IRWXU) {
         allowOwner(parent, name);
     }
@@ -50,7 +50,7 @@ Directory openToEmpty(Directory const &parent, std::string const &name) {
 
 /// @return true when it is gone, false when it is a directory
 bool removeFile(Directory const &parent, std::string const &name) {
-    if (::unlinkat(parent.descriptor.number(), name.c_str(), 0) == 0 || errno == ENOENT) {
+    if (::unlinkat(parent.descriptor.get(), name.c_str(), 0) == 0 || errno == ENOENT) {
         return true;
     }
     // A directory gives EISDIR here and EPERM elsewhere.
@@ -94,7 +94,7 @@ private:
     }
 
     void removeDirectory(std::string const &name) {
-        if (::unlinkat(top_.descriptor.number(), name.c_str(), AT_REMOVEDIR) == 0) {
+        if (::unlinkat(top_.descriptor.get(), name.c_str(), AT_REMOVEDIR) == 0) {
             return;
         }
         Directory const directory = openToEmpty(top_, name);
@@ -114,10 +114,10 @@ private:
     }
 
     void moveUp(Directory const &from, std::string const &child) {
-        if (::unlinkat(from.descriptor.number(), child.c_str(), AT_REMOVEDIR) == 0) {
+        if (::unlinkat(from.descriptor.get(), child.c_str(), AT_REMOVEDIR) == 0) {
             return;
         }
-        if (::faccessat(from.descriptor.number(), child.c_str(), W_OK, AT_EACCESS | AT_SYMLINK_NOFOLLOW) != 0) {
+        if (::faccessat(from.descriptor.get(), child.c_str(), W_OK, AT_EACCESS | AT_SYMLINK_NOFOLLOW) != 0) {
             allowOwner(from, child); // a directory that changes its parent must be writable itself
         }
         while (moveTo(from, child, top_, ".moved-" + std::to_string(next_++)) == Outcome::InTheWay) {

@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "Descriptor.h"
+#include "Directory.h"
 
 namespace Kestrel {
 

@@ -40,8 +40,8 @@ void addToHost(Host &host, Store::FileSystem const &fileSystem, bool mount) {
     try {
         if (mount && !made && kindOf(host.places.volumes(), fileSystem.name) != EntryKind::Directory) {
             throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
-                                "\"" + host.places.volumes().pathOf(fileSystem.name) +
-                                    "\" is in the way: it is no directory; move it elsewhere");
+                                "'" + host.places.volumes().pathOf(fileSystem.name) +
+                                    "' is in the way: it is no directory; move it elsewhere");
         }
         host.store.addFileSystem(fileSystem);
     } catch (Wire::Failure const &) {
@@ -56,7 +56,7 @@ void removeFromHost(Host &host, std::string const &containerId) {
     auto const fileSystem = host.store.fileSystem(containerId);
     if (!fileSystem) {
         throw Wire::Failure(Wire::ErrorCode::NoSuchContainer,
-                            "The storage container " + containerId + " is not mounted on this host");
+                            "the storage container " + containerId + " is not mounted on this host");
     }
     VolumeDirectories directories(host);
     directories.finishUnsettled();
@@ -64,12 +64,12 @@ void removeFromHost(Host &host, std::string const &containerId) {
     Directory const &volumes = host.places.volumes();
     if (removeEmptyIn(volumes, fileSystem->name) == Outcome::InTheWay) {
         bool const isDirectory = kindOf(volumes, fileSystem->name) == EntryKind::Directory;
-        throw Wire::Failure(Wire::ErrorCode::InUse,
-                            "The storage container \"" + fileSystem->name + "\" is in use: its directory \"" +
-                                volumes.pathOf(fileSystem->name) +
-                                (isDirectory ? "\" is not empty, there is \"" +
-                                                   anyEntryIn(openIn(volumes, fileSystem->name)) + "\" in it"
-                                             : "\" is no directory any more"));
+        throw Wire::Failure(
+            Wire::ErrorCode::InUse,
+            "the storage container '" + fileSystem->name + "' is in use: its directory '" +
+                volumes.pathOf(fileSystem->name) +
+                (isDirectory ? "' is not empty, there is '" + anyEntryIn(openIn(volumes, fileSystem->name)) + "' in it"
+                             : "' is no directory any more"));
     }
     try {
         host.store.removeFileSystem(containerId);

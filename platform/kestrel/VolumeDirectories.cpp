@@ -11,12 +11,12 @@ constexpr mode_t contentMode = 0755;
 
 [[noreturn]] void refuseInTheWay(std::string const &path) {
     throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
-                        "\"" + path + "\" is in the way: it is no config volume's directory; move it elsewhere");
+                        "'" + path + "' is in the way: it is no config volume's directory; move it elsewhere");
 }
 
 [[noreturn]] void refuseReplaced(std::string const &path) {
     throw Wire::Failure(Wire::ErrorCode::InUse,
-                        "\"" + path + "\" is no longer the directory that was mounted there; move it elsewhere");
+                        "'" + path + "' is no longer the directory that was mounted there; move it elsewhere");
 }
 
 } // namespace

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Explain.h"
 
-#include <cctype>
 #include <cerrno>
 #include <new>
 #include <system_error>
@@ -34,9 +33,7 @@ Error explainIo(int code, int systemError, char const *detail, std::string const
 } // namespace
 
 std::string named(std::string const &kindName, std::string const &path) {
-    std::string name = kindName.empty() ? std::string("the database") : kindName;
-    name[0] = static_cast<char>(std::toupper(static_cast<unsigned char>(name[0])));
-    return name + " \"" + path + '"';
+    return (kindName.empty() ? "the database" : kindName) + " '" + path + '\'';
 }
 
 Error explain(int code, int systemError, char const *detail, std::string const &name,

@@ -8,7 +8,7 @@
 
 namespace Sqlite {
 
-/// "The host store "/srv/host.db"": how every sentence begins.
+/// "the host store '/srv/host.db'": how every sentence begins.
 std::string named(std::string const &kindName, std::string const &path);
 
 /// Turns a result code of SQLite into an Error with a finished sentence. Memory that ran out is thrown as

@@ -16,11 +16,11 @@ namespace {
 constexpr mode_t directoryMode = 0755;
 
 [[noreturn]] void cannotMake(std::string const &path, int systemError) {
-    throw Wire::Failure(
-        systemError == ENOSPC || systemError == EDQUOT                          ? Wire::ErrorCode::DiskFull
-        : systemError == EROFS || systemError == EACCES || systemError == EPERM ? Wire::ErrorCode::FileReadOnly
-                                                                                : Wire::ErrorCode::IoError,
-        "The directory \"" + path + "\" cannot be made: " + std::generic_category().message(systemError));
+    throw Wire::Failure(systemError == ENOSPC || systemError == EDQUOT ? Wire::ErrorCode::DiskFull
+                        : systemError == EROFS || systemError == EACCES || systemError == EPERM
+                            ? Wire::ErrorCode::FileReadOnly
+                            : Wire::ErrorCode::IoError,
+                        "the directory '" + path + "' cannot be made: " + std::generic_category().message(systemError));
 }
 
 std::string parentOf(std::string const &path) {

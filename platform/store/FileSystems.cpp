@@ -28,17 +28,17 @@ std::optional<FileSystem> find(Sqlite::Database *database, char const *sql, std:
 [[noreturn]] void refuseTaken(FileSystem const &wanted, std::string const &name, std::string const &containerId) {
     throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
                         wanted.containerId == containerId
-                            ? "The storage container " + containerId + " is mounted already, as \"" + name + '"'
-                            : "The name \"" + name + "\" is taken: the storage container " + containerId +
+                            ? "the storage container " + containerId + " is mounted already, as '" + name + '\''
+                            : "the name '" + name + "' is taken: the storage container " + containerId +
                                   " is mounted under it");
 }
 
 [[noreturn]] void refuseInUse(std::string const &name, int64_t count, std::string const &first) {
     throw Wire::Failure(Wire::ErrorCode::InUse,
-                        count == 1 ? "The storage container \"" + name + "\" is in use: the config volume \"" + first +
-                                         "\" is mounted in it"
-                                   : "The storage container \"" + name + "\" is in use: " + std::to_string(count) +
-                                         " config volumes are mounted in it, the first is \"" + first + '"');
+                        count == 1 ? "the storage container '" + name + "' is in use: the config volume '" + first +
+                                         "' is mounted in it"
+                                   : "the storage container '" + name + "' is in use: " + std::to_string(count) +
+                                         " config volumes are mounted in it, the first is '" + first + '\'');
 }
 
 void refuseMounts(Sqlite::Database &database, std::string_view containerId) {

@@ -40,7 +40,7 @@ Sqlite::Database *HostStore::reader() {
 Sqlite::Database &HostStore::writer() {
     if (mode_ == Mode::QueryOnly) {
         throw Wire::Failure(Wire::ErrorCode::FileReadOnly,
-                            "The host store \"" + path_ + "\" was opened for reading only");
+                            "the host store '" + path_ + "' was opened for reading only");
     }
     if (reader() == nullptr) {
         makeDirectoryDurably(root_);

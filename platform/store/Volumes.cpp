@@ -52,8 +52,8 @@ void put(Sqlite::Database &database, Volume const &volume) {
             database, "SELECT v.uuid FROM volume v JOIN file_system f ON f.id = v.file_system "
                       "WHERE f.container_id = ?1 AND v.directory_name = ?2 AND v.state IN (0, 2) AND v.uuid <> ?3");
         if (taken.bind(1, volume.containerId).bind(2, volume.directoryName).bind(3, volume.uuid).step()) {
-            throw Wire::Failure(Wire::ErrorCode::AlreadyExists, "The directory name \"" + volume.directoryName +
-                                                                    "\" is taken: the config volume " + taken.text(0) +
+            throw Wire::Failure(Wire::ErrorCode::AlreadyExists, "the directory name '" + volume.directoryName +
+                                                                    "' is taken: the config volume " + taken.text(0) +
                                                                     " is mounted under it");
         }
     }
@@ -68,7 +68,7 @@ void put(Sqlite::Database &database, Volume const &volume) {
         .run();
     if (database.changes() == 0) {
         throw Wire::Failure(Wire::ErrorCode::NoSuchContainer,
-                            "The storage container " + volume.containerId + " is not mounted on this host");
+                            "the storage container " + volume.containerId + " is not mounted on this host");
     }
 }
 

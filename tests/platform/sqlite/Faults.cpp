@@ -79,8 +79,8 @@ TEST_F(FaultTest, fault_49_BusyAfterTheTimeout) {
     auto const waited = std::chrono::steady_clock::now() - begin;
     ASSERT_TRUE(error);
     EXPECT_EQ(error->kind(), ErrorKind::Busy);
-    EXPECT_EQ(error->sentence(), "The test file \"" + at("a.db") +
-                                     "\" is busy: another process has held its lock for 60 ms; nothing was changed, "
+    EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") +
+                                     "' is busy: another process has held its lock for 60 ms; nothing was changed, "
                                      "try again");
     EXPECT_GE(waited, std::chrono::milliseconds{50});
     EXPECT_EQ(countItems(waiter), 1);
@@ -93,7 +93,7 @@ TEST_F(FaultTest, fault_49_AnEventLoopNeverWaits) {
     auto const error = errorOf([&] { countItems(reader); });
     ASSERT_TRUE(error);
     EXPECT_EQ(error->kind(), ErrorKind::Busy);
-    EXPECT_EQ(error->sentence(), "The test file \"" + at("a.db") + "\" is busy: another process is changing it");
+    EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") + "' is busy: another process is changing it");
     holder.execute("ROLLBACK");
     EXPECT_EQ(countItems(reader), 1);
 }

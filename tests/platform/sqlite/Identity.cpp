@@ -50,7 +50,7 @@ TEST_F(IdentityTest, OnlyCreateMakesAFile) {
         auto const error = errorOf([&] { Database(at("a.db"), kind(), mode); });
         ASSERT_TRUE(error);
         EXPECT_EQ(error->kind(), ErrorKind::Missing);
-        EXPECT_EQ(error->sentence(), "The test file \"" + at("a.db") + "\" does not exist");
+        EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") + "' does not exist");
         EXPECT_FALSE(exists(at("a.db")));
     }
 }

@@ -7,42 +7,16 @@
 #pragma once
 
 #include <string>
-#include <utility>
 
 #include <sys/types.h>
 
+#include "wire/UniqueFd.h"
+
 namespace Kestrel {
-
-/// Owns a file descriptor.
-class Descriptor {
-public:
-    Descriptor() = default;
-    explicit Descriptor(int number) noexcept
-        : number_(number) {}
-    ~Descriptor();
-    Descriptor(Descriptor &&other) noexcept
-        : number_(std::exchange(other.number_, -1)) {}
-    Descriptor &operator=(Descriptor &&other) noexcept {
-        std::swap(number_, other.number_);
-        return *this;
-    }
-    Descriptor(Descriptor const &) = delete;
-    Descriptor &operator=(Descriptor const &) = delete;
-
-    int number() const noexcept {
-        return number_;
-    }
-    explicit operator bool() const noexcept {
-        return number_ >= 0;
-    }
-
-private:
-    int number_ = -1;
-};
 
 /// A directory that is held open, with its path for sentences.
 struct Directory {
-    Descriptor descriptor;
+    Wire::UniqueFd descriptor;
     std::string path;
 
     std::string pathOf(std::string const &name) const {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "Descriptor.h"
+#include "Directory.h"
 
 #include <cerrno>
 #include <cstdio>
@@ -45,7 +45,7 @@ bool onOneDevice(int first, int second) {
 }
 
 /// Resolves one name beneath a directory, following nothing.
-Descriptor openBeneath(int parent, char const *name, bool sameMount) {
+Wire::UniqueFd openBeneath(int parent, char const *name, bool sameMount) {
     open_how how{};
     how.flags = directoryFlags;
     how.resolve = RESOLVE_BENEATH | RESOLVE_NO_SYMLINKS | RESOLVE_NO_MAGICLINKS | (sameMount ? RESOLVE_NO_XDEV : 0U);
@@ -54,25 +54,25 @@ Descriptor openBeneath(int parent, char const *name, bool sameMount) {
         result = ::syscall(SYS_openat2, parent, name, &how, sizeof(how));
     } while (result < 0 && errno == EAGAIN); // something on the way was being renamed; the kernel asks to try again
     if (result >= 0 || (errno != ENOSYS && errno != EPERM)) {
-        return Descriptor(static_cast<int>(result));
+        return Wire::UniqueFd(static_cast<int>(result));
     }
     // An older kernel, or a sandbox that does not know the call.
-    Descriptor descriptor(::openat(parent, name, directoryFlags));
-    if (descriptor && sameMount && !onOneDevice(parent, descriptor.number())) {
+    Wire::UniqueFd descriptor(::openat(parent, name, directoryFlags));
+    if (descriptor && sameMount && !onOneDevice(parent, descriptor.get())) {
         errno = EXDEV;
-        return Descriptor();
+        return Wire::UniqueFd();
     }
     return descriptor;
 }
 
 Directory openChecked(Directory const &parent, std::string const &name, bool sameMount) {
-    Descriptor descriptor = openBeneath(parent.descriptor.number(), name.c_str(), sameMount);
+    Wire::UniqueFd descriptor = openBeneath(parent.descriptor.get(), name.c_str(), sameMount);
     if (!descriptor && errno != ENOENT) {
         int systemError = errno;
         // A link gives ELOOP or ENOTDIR, as the kernel happens to look first.
         struct stat status {};
         if (systemError == ENOTDIR &&
-            ::fstatat(parent.descriptor.number(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
+            ::fstatat(parent.descriptor.get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
             S_ISLNK(status.st_mode)) {
             systemError = ELOOP;
         }
@@ -83,22 +83,16 @@ Directory openChecked(Directory const &parent, std::string const &name, bool sam
 
 } // namespace
 
-Descriptor::~Descriptor() {
-    if (number_ >= 0) {
-        ::close(number_);
-    }
-}
-
 void failFor(std::string const &path, std::string const &action, int systemError) {
     std::string const reason = systemError == ELOOP     ? "a symbolic link stands there"
                                : systemError == EXDEV   ? "it is on another file system"
                                : systemError == ENOTDIR ? "it is no directory"
                                                         : std::generic_category().message(systemError);
-    throw Wire::Failure(codeOf(systemError), "The directory \"" + path + "\" cannot be " + action + ": " + reason);
+    throw Wire::Failure(codeOf(systemError), "the directory '" + path + "' cannot be " + action + ": " + reason);
 }
 
 Directory openRoot(std::string const &path) {
-    Descriptor descriptor(::open(path.empty() ? "/" : path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    Wire::UniqueFd descriptor(::open(path.empty() ? "/" : path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!descriptor) {
         failFor(path, "opened", errno);
     }
@@ -114,7 +108,7 @@ Directory openInSameMount(Directory const &parent, std::string const &name) {
 }
 
 bool makeIn(Directory const &parent, std::string const &name, mode_t mode) {
-    if (::mkdirat(parent.descriptor.number(), name.c_str(), mode) == 0) {
+    if (::mkdirat(parent.descriptor.get(), name.c_str(), mode) == 0) {
         return true;
     }
     if (errno != EEXIST) {
@@ -137,7 +131,7 @@ Directory openOrMakeIn(Directory const &parent, std::string const &name, mode_t 
 
 EntryKind kindOf(Directory const &parent, std::string const &name) {
     struct stat status {};
-    if (::fstatat(parent.descriptor.number(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
+    if (::fstatat(parent.descriptor.get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
         if (errno != ENOENT) {
             failFor(parent.pathOf(name), "looked at", errno);
         }
@@ -147,8 +141,8 @@ EntryKind kindOf(Directory const &parent, std::string const &name) {
 }
 
 Outcome moveTo(Directory const &from, std::string const &fromName, Directory const &to, std::string const &toName) {
-    int const source = from.descriptor.number();
-    int const target = to.descriptor.number();
+    int const source = from.descriptor.get();
+    int const target = to.descriptor.get();
     if (::renameat2(source, fromName.c_str(), target, toName.c_str(), RENAME_NOREPLACE) == 0) {
         return Outcome::Done;
     }
@@ -170,11 +164,11 @@ Outcome moveTo(Directory const &from, std::string const &fromName, Directory con
     if (systemError == EEXIST || systemError == ENOTEMPTY) {
         return Outcome::InTheWay;
     }
-    failFor(from.pathOf(fromName), "moved to \"" + to.pathOf(toName) + '"', systemError);
+    failFor(from.pathOf(fromName), "moved to '" + to.pathOf(toName) + '\'', systemError);
 }
 
 Outcome removeEmptyIn(Directory const &parent, std::string const &name) {
-    if (::unlinkat(parent.descriptor.number(), name.c_str(), AT_REMOVEDIR) == 0) {
+    if (::unlinkat(parent.descriptor.get(), name.c_str(), AT_REMOVEDIR) == 0) {
         return Outcome::Done;
     }
     switch (errno) {
@@ -190,7 +184,7 @@ Outcome removeEmptyIn(Directory const &parent, std::string const &name) {
 }
 
 std::string anyEntryIn(Directory const &directory) {
-    int const own = ::fcntl(directory.descriptor.number(), F_DUPFD_CLOEXEC, 3);
+    int const own = ::fcntl(directory.descriptor.get(), F_DUPFD_CLOEXEC, 3);
     std::unique_ptr<DIR, int (*)(DIR *)> const listing(own < 0 ? nullptr : ::fdopendir(own), ::closedir);
     if (!listing) {
         if (own >= 0) {
