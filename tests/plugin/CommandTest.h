@@ -14,6 +14,7 @@
 #include "doubles/KestrelDouble.h"
 #include "doubles/LumoDouble.h"
 #include "doubles/RecordingCall.h"
+#include "kestrel/Lib.h"
 
 namespace PluginTest {
 
@@ -32,6 +33,19 @@ struct LeftOver {
     int fileSystems = 0;
     int results = 0;
 };
+
+/// Expects the call to fail because no daemon session can be opened, at the unit and line given.
+template <class Call>
+void expectNoSession(Call const &call, std::string const &unit, unsigned line) {
+    try {
+        call();
+        FAIL() << "nothing was thrown";
+    } catch (Kestrel::Lib::KestrelException const &failure) {
+        EXPECT_EQ(failure.GetMessage(), "Unable to initialize lumoLib");
+        EXPECT_EQ(failure.GetFile(), "apps/tovicli/plugins/lumo/internal/" + unit);
+        EXPECT_EQ(failure.GetLine(), line);
+    }
+}
 
 class CommandTest : public testing::Test {
 protected:

@@ -1,0 +1,19 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "CommandFrame.h"
+
+namespace TarselCli::LumoNamespace {
+
+/// `orkaprovider deactivate`: stops a provider being the active one for a storage array.
+class LUMO_COMMAND_EXPORT VendorProviderDeactivate : public virtual Plexa::AutoCli::Command {
+public:
+    static boost::shared_ptr<VendorProviderDeactivate> New();
+    VendorProviderDeactivate();
+    ~VendorProviderDeactivate() override;
+    InputSpecPtr GetInputSpecInternal() override;
+    OutputSpecPtr GetOutputSpecInternal() override;
+    void ExecuteInternal(InputPtr const &input, OutputPtr const &output) override;
+};
+
+} // namespace TarselCli::LumoNamespace
