@@ -162,7 +162,7 @@ void Connection::request(Repeat repeat, Wire::Deadline deadline, Fill fill, Take
         if (exception.getType() == kj::Exception::Type::OVERLOADED) {
             throw std::bad_alloc();
         }
-        throw unexpected(exception.getDescription().cStr());
+        throw unexpected("its reply is malformed");
     } catch (...) {
         if (!answerComplete_) {
             close(); // what is left of the answer would be taken for the next one
@@ -254,6 +254,9 @@ Wire::Reply::Reader Connection::nextReply(Wire::Deadline deadline) {
     Wire::Reply::Reader const reply = reader_->getRoot<Wire::Reply>();
     bool const mine = reply.getId() == lastId_;
     if (reply.isFailure() && (mine || reply.getId() == 0)) {
+        if (reply.getFailure().getCode() == 0) {
+            throw unexpected("it answered a failure without a code");
+        }
         answerComplete_ = mine && reply.getLast();
         throw answered(reply.getFailure());
     }
