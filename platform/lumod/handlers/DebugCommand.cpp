@@ -1,0 +1,48 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "handlers/Handlers.h"
+
+#include <fmt/format.h>
+
+#include "ObjectDump.h"
+
+namespace Lumod {
+
+namespace {
+
+LogLevel requestedLevel(int64_t number) {
+    auto const level = logLevelOf(number);
+    if (!level) {
+        throw Wire::Failure(
+            Wire::ErrorCode::InvalidArgument,
+            fmt::format("{} is no log level; those are 1 (quiet), 2 (panic), 4 (error), 8 (warning), 16 (info), "
+                        "32 (verbose), 64 (trivia)",
+                        number));
+    }
+    return *level;
+}
+
+} // namespace
+
+Answer<ReplyPtr> debugCommand(Core &core, CallPtr const &call, Wire::Request::Reader request) {
+    Wire::DebugCommand::Reader const command = request.getDebugCommand();
+    int64_t const periodUs = command.getUnbindPeriodUs();
+    if (command.getLogLevel() >= 0) {
+        LogLevel const level = requestedLevel(command.getLogLevel());
+        core.log.setLevel(level);
+        core.log.writeAlways(call->trace, fmt::format("The log level is {}", nameOf(level)));
+    }
+    if (periodUs > 0) {
+        core.unbindTimer.setPeriod(periodUs * kj::MICROSECONDS);
+        core.log.write(LogLevel::Info, call->trace, fmt::format("The unbind period is {} us", periodUs));
+    }
+    auto unbound = periodUs == 0 ? core.unbindTimer.unbindAll(call) : Answer<Done>(Outcome<Done>(Done{}));
+    bool const wantsDump = command.getDump() > 0;
+    return andThen(std::move(unbound), [&core, call, wantsDump](Done) {
+        if (wantsDump) {
+            dumpObjects(core, call->trace);
+        }
+        return doneReply();
+    });
+}
+
+} // namespace Lumod

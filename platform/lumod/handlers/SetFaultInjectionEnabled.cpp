@@ -1,0 +1,14 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "handlers/Handlers.h"
+
+namespace Lumod {
+
+Answer<ReplyPtr> setFaultInjectionEnabled(Core &core, CallPtr const &call, Wire::Request::Reader request) {
+    bool const enabled = request.getSetFaultInjectionEnabled();
+    core.faults.setEnabled(enabled);
+    core.log.write(LogLevel::Warning, call->trace,
+                   enabled ? "Fault injection is enabled" : "Fault injection is disabled");
+    return Outcome<ReplyPtr>(doneReply());
+}
+
+} // namespace Lumod

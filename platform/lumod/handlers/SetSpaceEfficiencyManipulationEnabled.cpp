@@ -1,0 +1,15 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "handlers/Handlers.h"
+
+namespace Lumod {
+
+Answer<ReplyPtr> setSpaceEfficiencyManipulationEnabled(Core &core, CallPtr const &call, Wire::Request::Reader request) {
+    bool const enabled = request.getSetSpaceEfficiencyManipulationEnabled();
+    core.services.modifiesProfiles = enabled;
+    core.log.write(LogLevel::Info, call->trace,
+                   enabled ? "Storage profiles are modified for space efficiency"
+                           : "Storage profiles are left as they are given");
+    return Outcome<ReplyPtr>(doneReply());
+}
+
+} // namespace Lumod
