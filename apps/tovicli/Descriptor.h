@@ -29,6 +29,10 @@ public:
     bool isOpen() const {
         return number_ >= 0;
     }
+    /// Leaves the descriptor open for the rest of the process.
+    void keepForever() {
+        number_ = -1;
+    }
 
 private:
     int number_;

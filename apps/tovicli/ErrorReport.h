@@ -20,6 +20,9 @@ public:
     void setMachine(bool machine) {
         machine_ = machine;
     }
+    bool isMachine() const {
+        return machine_;
+    }
     void setShowRequestId(bool show) {
         showRequestId_ = show;
     }

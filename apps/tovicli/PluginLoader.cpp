@@ -60,11 +60,9 @@ PluginLoader::Directory &PluginLoader::load(std::string const &path) {
     }
     loaded.troubles = std::move(opened.skipped);
     for (PluginFile &file : opened.files) {
-        Plugin plugin;
-        plugin.file = std::move(file);
-        if (std::string const problem = loadPlugin(plugin); !problem.empty()) {
-            loaded.troubles.push_back("plug-in '" + plugin.file.name + "' skipped: " + problem);
-            skipped_.push_back(std::move(plugin.file.descriptor));
+        Plugin plugin{file.name, nullptr};
+        if (std::string const problem = loadPlugin(file, plugin.entry); !problem.empty()) {
+            loaded.troubles.push_back("plug-in '" + file.name + "' skipped: " + problem);
         } else {
             loaded.plugins.push_back(std::move(plugin));
         }
@@ -72,8 +70,8 @@ PluginLoader::Directory &PluginLoader::load(std::string const &path) {
     return loaded;
 }
 
-std::string PluginLoader::loadPlugin(Plugin &plugin) {
-    int const descriptor = plugin.file.descriptor.number();
+std::string PluginLoader::loadPlugin(PluginFile &file, EntryPoint &entry) {
+    int const descriptor = file.descriptor.number();
     ElfFile const elf = readElfFile(descriptor);
     if (!elf.problem.empty()) {
         return elf.problem;
@@ -86,11 +84,14 @@ std::string PluginLoader::loadPlugin(Plugin &plugin) {
     if (library == nullptr) {
         return loaderText();
     }
-    void *const entry = dlsym(library, "AutoCli_RegisterNamespaces");
-    if (entry == nullptr) {
+    // The system's loader knows the library by this path, and by the file's inode, as long as it is loaded, which is
+    // until the process ends: a number or an inode that is used again would stand for the earlier library.
+    file.descriptor.keepForever();
+    void *const symbol = dlsym(library, "AutoCli_RegisterNamespaces");
+    if (symbol == nullptr) {
         return "it has no entry point AutoCli_RegisterNamespaces";
     }
-    plugin.entry = reinterpret_cast<EntryPoint>(entry);
+    entry = reinterpret_cast<EntryPoint>(symbol);
     return {};
 }
 
@@ -111,7 +112,7 @@ void PluginLoader::registerPlugin(Plugin const &plugin, boost::shared_ptr<Plexa:
         }
     });
     if (!reason.empty()) {
-        registration.troubles.push_back("plug-in '" + plugin.file.name + "' failed: " + reason);
+        registration.troubles.push_back("plug-in '" + plugin.name + "' failed: " + reason);
     }
 }
 

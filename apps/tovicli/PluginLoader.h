@@ -28,10 +28,8 @@ public:
 private:
     using EntryPoint = void (*)(boost::shared_ptr<Plexa::AutoCli::Namespace> &root);
 
-    /// The descriptor stays open: the loader knows a library by the path /proc/self/fd/N, and a number that is used
-    /// again would name the earlier library.
     struct Plugin {
-        PluginFile file;
+        std::string name;
         EntryPoint entry = nullptr;
     };
     struct Directory {
@@ -41,15 +39,13 @@ private:
 
     Directory &load(std::string const &path);
     /// @return why the file is not used; empty when its entry point is at hand
-    std::string loadPlugin(Plugin &plugin);
+    std::string loadPlugin(PluginFile &file, EntryPoint &entry);
     void registerPlugin(Plugin const &plugin, boost::shared_ptr<Plexa::AutoCli::Namespace> &root,
                         Environment &environment, Registration &registration);
 
     PlatformLibraries platform_;
     uid_t user_;
     std::map<std::string, Directory> directories_;
-    /// Of files that were looked at in vain; one of them may be loaded all the same.
-    std::vector<Descriptor> skipped_;
 };
 
 } // namespace Tovicli

@@ -91,6 +91,9 @@ std::string path(CallSpec::Input const &options, Environment const *environment,
     if (!source) {
         return fallback;
     }
+    if (environment == nullptr) {
+        throw UsageError(source->origin + " cannot be used: this program runs with rights that its caller lacks");
+    }
     if (source->value.empty()) {
         throw UsageError(source->origin + ": a directory is expected, an empty text was given");
     }

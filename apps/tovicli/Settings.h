@@ -38,7 +38,7 @@ struct Defaults {
 /// The declaration of the global options; parser and help read it.
 boost::shared_ptr<Plexa::CallSpec::InputSpec> globalOptions();
 
-/// @param environment not read when null, as in a privileged process
+/// @param environment null in a privileged process: the caller chooses neither variables nor directories then
 /// @throws Plexa::UsageError for a bad value of an option or a variable
 Settings settingsFrom(Plexa::CallSpec::Input const &options, Environment const *environment, Defaults const &defaults);
 

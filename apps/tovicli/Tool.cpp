@@ -32,6 +32,17 @@ void checkWords(std::vector<std::string> const &words) {
     }
 }
 
+MapEnvironment copied(Environment const &environment) {
+    MapEnvironment copy;
+    for (char const *name :
+         {"TOVI_FORMAT", "TOVI_LOG_LEVEL", "TOVI_OFFLINE", "TOVI_PLUGINS", "TOVI_ROOT", "TOVI_TIMEOUT_MS"}) {
+        if (std::optional<std::string> const value = environment.get(name)) {
+            copy.set(name, *value);
+        }
+    }
+    return copy;
+}
+
 std::string withoutLineEnd(std::string text) {
     if (text.ends_with('\n')) {
         text.pop_back();
@@ -71,7 +82,9 @@ ExitStatus Tool::run(std::vector<std::string> const &arguments) {
 }
 
 ExitStatus Tool::runWords(std::vector<std::string> const &words) {
-    Environment const *const environment = context_.privileged ? nullptr : &context_.environment;
+    // As the user set it: the settings themselves will be written over it.
+    MapEnvironment const original = context_.privileged ? MapEnvironment() : copied(context_.environment);
+    Environment const *const environment = context_.privileged ? nullptr : &original;
     FirstReading const reading = readAhead(words);
     Settings settings = settingsFrom(*reading.certain, environment, context_.defaults);
     if (settings.version) {
@@ -82,7 +95,7 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
     } catch (UsageError const &) {
         // May be a command's value of its own; the full reading decides.
     }
-    offlineByUser_ = environment != nullptr && environment->get("TOVI_OFFLINE").has_value();
+    offlineByUser_ = original.get("TOVI_OFFLINE").has_value();
     Root root = grow(settings);
     Misread mistake;
     CommandLine line = readCommandLine(root, words, mistake);
@@ -143,10 +156,10 @@ void Tool::apply(Settings const &settings) {
 }
 
 ExitStatus Tool::misread(Misread const &mistake) {
-    if (registration_.daemonMissing) {
-        report_.warn(daemonSentence());
-    }
     if (mistake.unknownWord && !registration_.troubles.empty()) {
+        if (registration_.daemonMissing) {
+            report_.warn(daemonSentence());
+        }
         report_.fail(mistake.sentence, std::nullopt, "a plug-in that could not be loaded may hold it");
         return ExitStatus::Unavailable;
     }
@@ -223,9 +236,10 @@ void Tool::tell(Outcome const &outcome) {
         }
         return;
     }
-    std::string message = withoutLineEnd(outcome.message);
-    if (daemonDead) {
+    std::string message = outcome.message;
+    if (daemonDead && !report_.isMachine()) {
         // One line instead of message, cause and warning, which would say the same three times.
+        message = withoutLineEnd(message);
         std::string const &sentence = outcome.cause->sentence;
         message += contains(message, sentence) ? "" : ": " + sentence;
         message += contains(message, socketPath()) ? "" : " (" + socketPath() + ")";

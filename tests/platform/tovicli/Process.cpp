@@ -1,0 +1,135 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// What only the real process shows: descriptors, signals, exit status.
+#include <cerrno>
+#include <csignal>
+#include <fcntl.h>
+#include <functional>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+#include <vector>
+
+#include "TemporaryDirectory.h"
+
+namespace {
+
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
+
+class Process : public ::testing::Test {
+protected:
+    /// Runs the tool with the test plug-in. Standard output and error go to files.
+    /// @param arrange called in the new process before the tool starts
+    /// @return the exit status, or minus the signal that ended it
+    int run(
+        std::vector<std::string> words, std::function<void()> const &arrange = [] {}) {
+        words.insert(words.begin(), {TEST_TOVICLI, "--plugins", plugins.path()});
+        std::vector<char *> arguments;
+        for (std::string &word : words) {
+            arguments.push_back(word.data());
+        }
+        arguments.push_back(nullptr);
+        pid_t const child = fork();
+        if (child == 0) {
+            signal(SIGINT, SIG_DFL);
+            dup2(open((files / "out").c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), STDOUT_FILENO);
+            dup2(open((files / "err").c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), STDERR_FILENO);
+            arrange();
+            execv(TEST_TOVICLI, arguments.data());
+            _exit(127);
+        }
+        int status = 0;
+        while (waitpid(child, &status, 0) == -1 && errno == EINTR) {
+        }
+        return WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
+    }
+    std::string output() {
+        return readFile(files / "out");
+    }
+    std::string errors() {
+        return readFile(files / "err");
+    }
+
+    Process() {
+        plugins.addPlugin("behaves", "behaves.so");
+    }
+    TemporaryDirectory plugins;
+    TemporaryDirectory files;
+};
+
+TEST_F(Process, RunsACommandOfAPlugin) {
+    EXPECT_EQ(run({"storage", "sample", "answer"}), 0);
+    EXPECT_EQ(output(), "42\n");
+    EXPECT_EQ(errors(), "");
+}
+
+TEST_F(Process, fault_6_ClosedDescriptorsAreOccupiedBeforeAnythingIsOpened) {
+    auto const closeBoth = [] {
+        close(STDIN_FILENO);
+        close(STDOUT_FILENO);
+    };
+    EXPECT_EQ(run({"storage", "sample", "descriptor"}, closeBoth), 1);
+    ASSERT_THAT(errors(), StartsWith("tovicli: next free descriptor "));
+    EXPECT_GT(std::stoi(errors().substr(std::string("tovicli: next free descriptor ").size())), STDERR_FILENO);
+}
+
+TEST_F(Process, fault_6_ClosedOutputIsReported) {
+    EXPECT_EQ(run({"storage", "sample", "answer"}, [] { close(STDOUT_FILENO); }), 4);
+    EXPECT_EQ(errors(), "tovicli: cannot write the output: Bad file descriptor; the command itself was completed\n");
+    EXPECT_EQ(run({"--version"},
+                  [] {
+                      close(STDIN_FILENO);
+                      close(STDOUT_FILENO);
+                      close(STDERR_FILENO);
+                  }),
+              4);
+}
+
+TEST_F(Process, fault_63_FullDeviceIsReported) {
+    EXPECT_EQ(run({"storage", "sample", "answer"}, [] { dup2(open("/dev/full", O_WRONLY), STDOUT_FILENO); }), 4);
+    EXPECT_EQ(errors(),
+              "tovicli: cannot write the output: No space left on device; the command itself was completed\n");
+}
+
+TEST_F(Process, fault_63_ClosedPipeIsReportedNotASignal) {
+    auto const closedPipe = [] {
+        int ends[2] = {-1, -1};
+        if (pipe(ends) == 0) {
+            dup2(ends[1], STDOUT_FILENO);
+            close(ends[0]);
+            close(ends[1]);
+        }
+    };
+    EXPECT_EQ(run({"storage", "sample", "answer"}, closedPipe), 4);
+    EXPECT_EQ(errors(), "tovicli: cannot write the output: Broken pipe; the command itself was completed\n");
+}
+
+TEST_F(Process, InterruptEndsWith130) {
+    EXPECT_EQ(run({"storage", "sample", "interrupt"}), 130);
+    EXPECT_EQ(errors(), "tovicli: interrupted\n");
+}
+
+TEST_F(Process, InterruptThatWasIgnoredStaysIgnored) {
+    EXPECT_EQ(run({"storage", "sample", "interrupt"}, [] { signal(SIGINT, SIG_IGN); }), 1);
+    EXPECT_EQ(errors(), "tovicli: survived\n");
+}
+
+TEST_F(Process, fault_1_EmptyArgumentListIsHarmless) {
+    pid_t const child = fork();
+    if (child == 0) {
+        char *nothing[] = {nullptr};
+        dup2(open("/dev/null", O_WRONLY), STDOUT_FILENO);
+        dup2(open("/dev/null", O_WRONLY), STDERR_FILENO);
+        execv(TEST_TOVICLI, nothing);
+        _exit(127);
+    }
+    int status = 0;
+    waitpid(child, &status, 0);
+    // Newer kernels put an empty name in; older ones hand the empty list over, which is a usage error.
+    ASSERT_TRUE(WIFEXITED(status));
+    EXPECT_TRUE(WEXITSTATUS(status) == 0 || WEXITSTATUS(status) == 2) << WEXITSTATUS(status);
+}
+
+} // namespace

@@ -1,0 +1,66 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// Registers "storage sample" with commands that show what the process around them is like.
+#include <csignal>
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <boost/make_shared.hpp>
+
+#include "plexa/AutoCli.h"
+
+namespace {
+
+using namespace Plexa;
+
+class Plain : public virtual AutoCli::Command {
+public:
+    boost::shared_ptr<CallSpec::InputSpec> GetInputSpecInternal() override {
+        return CallSpec::InputSpec::New();
+    }
+    boost::shared_ptr<CallSpec::OutputSpec> GetOutputSpecInternal() override {
+        auto const spec = CallSpec::OutputSpec::New();
+        spec->SetOutputType(MetaObj::MetaInt::New());
+        return spec;
+    }
+};
+
+/// The number of the next free descriptor.
+class NextDescriptor : public virtual Plain {
+public:
+    void ExecuteInternal(boost::shared_ptr<CallSpec::Input> const &,
+                         boost::shared_ptr<CallSpec::Output> const &output) override {
+        int const opened = open("/dev/null", O_RDONLY | O_CLOEXEC);
+        output->SetMessage("next free descriptor " + std::to_string(opened));
+        close(opened);
+    }
+};
+
+/// Is interrupted while it works.
+class Interrupt : public virtual Plain {
+public:
+    void ExecuteInternal(boost::shared_ptr<CallSpec::Input> const &,
+                         boost::shared_ptr<CallSpec::Output> const &output) override {
+        raise(SIGINT);
+        output->SetMessage("survived");
+    }
+};
+
+/// Answers 42.
+class Answer : public virtual Plain {
+public:
+    void ExecuteInternal(boost::shared_ptr<CallSpec::Input> const &,
+                         boost::shared_ptr<CallSpec::Output> const &output) override {
+        output->SetResult(MetaObj::MetaInt::New(42));
+        output->Complete();
+    }
+};
+
+} // namespace
+
+void AutoCli_RegisterNamespaces(boost::shared_ptr<AutoCli::Namespace> &root) {
+    auto const sample = root->SubNamespace("storage")->SubNamespace("sample");
+    sample->RegisterNamespaceNode(boost::make_shared<NextDescriptor>(), "descriptor");
+    sample->RegisterNamespaceNode(boost::make_shared<Interrupt>(), "interrupt");
+    sample->RegisterNamespaceNode(boost::make_shared<Answer>(), "answer");
+}
