@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "ConfigVolumes.h"
 
+#include <algorithm>
 #include <utility>
 
 #include "Names.h"
@@ -15,6 +16,13 @@ bool isMounted(Store::Volume const &volume) {
 
 bool isGone(Wire::Failure const &failure) {
     return failure.code() == Wire::ErrorCode::NoSuchVolume || failure.code() == Wire::ErrorCode::NoSuchContainer;
+}
+
+bool hasNamed(std::vector<Store::Volume> const &volumes, LumoClient::VolumeKey const &key) {
+    return std::any_of(volumes.begin(), volumes.end(), [&](Store::Volume const &volume) {
+        return volume.containerId == key.containerId &&
+               (key.uuid.empty() ? volume.directoryName == key.directoryName : volume.uuid == key.uuid);
+    });
 }
 
 Store::Volume inState(Store::Volume volume, Store::VolumeState state) {
@@ -134,34 +142,47 @@ void ConfigVolumes::unmount(std::string const &name, std::string const &uuid) {
 
 void ConfigVolumes::remove(std::string const &name, std::string const &uuid) {
     LumoClient::VolumeKey key = keyOf(name, uuid);
-    std::optional<Store::Volume> record;
+    std::vector<Store::Volume> here;
+    bool finishedNow = false;
     {
         VolumeDirectories directories(host_);
-        directories.finishUnsettled();
-        record = recordOf(key);
+        auto const settled = directories.finishUnsettled();
+        finishedNow = hasNamed(directories.removedNow(), key);
+        here = recordsOf(key, settled);
     }
-    if (record) {
+    if (here.size() == 1 && isMounted(here.front())) {
         // What is mounted here under the name is what its user means.
-        key = {containerId_, record->uuid, {}};
+        key = {containerId_, here.front().uuid, {}};
     }
-    std::vector<Store::Volume> gone;
     try {
-        gone.push_back({host_.client.deleteVirtualVolume(key, channel_).uuid, containerId_, {}, {}});
+        here = {{host_.client.deleteVirtualVolume(key, channel_).uuid, containerId_, {}, {}}};
     } catch (Wire::Failure const &failure) {
-        // A removal that was killed half-way, or a volume deleted elsewhere: its record and content are still here.
-        if (failure.code() != Wire::ErrorCode::NoSuchVolume) {
-            throw;
-        }
-        gone = record             ? std::vector<Store::Volume>{*record}
-               : key.uuid.empty() ? host_.store.unmountedVolumes(containerId_, key.directoryName)
-                                  : std::vector<Store::Volume>();
-        if (gone.empty()) {
+        // A removal that was cut off, or a volume deleted elsewhere: what is left of it here is all there is to remove.
+        if (failure.code() != Wire::ErrorCode::NoSuchVolume || (here.empty() && !finishedNow)) {
             throw;
         }
     }
-    for (Store::Volume const &volume : gone) {
+    for (Store::Volume const &volume : here) {
         forget(volume);
     }
+}
+
+std::vector<Store::Volume> ConfigVolumes::recordsOf(LumoClient::VolumeKey const &key,
+                                                    std::vector<Store::Volume> const &settled) {
+    if (auto const record = recordOf(key)) {
+        // A removal that is done leaves its record to the next write.
+        bool const isGone = record->state == Store::VolumeState::Removing && hasNamed(settled, key);
+        return isGone ? std::vector<Store::Volume>() : std::vector<Store::Volume>{*record};
+    }
+    std::vector<Store::Volume> records;
+    if (key.uuid.empty()) {
+        for (Store::Volume const &record : host_.store.unmountedVolumes(containerId_, key.directoryName)) {
+            if (record.state != Store::VolumeState::Removing) {
+                records.push_back(record);
+            }
+        }
+    }
+    return records;
 }
 
 void ConfigVolumes::forget(Store::Volume const &volume) {

@@ -25,6 +25,8 @@ private:
     LumoClient::VolumeKey keyOf(std::string const &name, std::string const &uuid) const;
     /// The record of a volume of this container, mounted or not; by name only a mounted one.
     std::optional<Store::Volume> recordOf(LumoClient::VolumeKey const &key);
+    /// What this host still has of a volume: the mounted one, or by name every one that was put away under it.
+    std::vector<Store::Volume> recordsOf(LumoClient::VolumeKey const &key, std::vector<Store::Volume> const &settled);
     Store::Volume requireMounted(LumoClient::VolumeKey const &key);
     /// @param mountedBefore set when the volume turns out to be mounted already
     void place(LumoClient::Volume const &bound, bool &mountedBefore);

@@ -37,6 +37,9 @@ void requireDirectoryName(std::string const &name, std::string const &what) {
     if (name.empty()) {
         throw Wire::Failure(Wire::ErrorCode::InvalidArgument, "the " + what + " is empty");
     }
+    if (auto const nul = name.find('\0'); nul != std::string::npos) {
+        refuse(name.substr(0, nul), what, "has a NUL byte behind these characters");
+    }
     if (name.size() > nameBytesMax) {
         refuse(name.substr(0, 40) + "...", what,
                "is longer than " + std::to_string(nameBytesMax) + " bytes (" + std::to_string(name.size()) + ")");

@@ -25,17 +25,18 @@ VolumeDirectories::VolumeDirectories(Host &host)
     : host_(host)
     , lock_(host.places.lumos(), host.lockTimeout) {}
 
-std::vector<Store::Volume> VolumeDirectories::finishUnsettled() {
-    std::vector<Store::Volume> settled;
+std::vector<Store::Volume> const &VolumeDirectories::finishUnsettled() {
+    settled_.clear();
+    removedNow_.clear();
     for (Store::Volume const &volume : host_.store.unsettledVolumes()) {
         try {
             finish(volume);
-            settled.push_back(volume);
+            settled_.push_back(volume);
         } catch (Wire::Failure const &) {
             // Something stands in its way. It stays unsettled, and an operation on that volume says why; others go on.
         }
     }
-    return settled;
+    return settled_;
 }
 
 void VolumeDirectories::finish(Store::Volume const &volume) {
@@ -52,7 +53,10 @@ void VolumeDirectories::finish(Store::Volume const &volume) {
         break;
     case Store::VolumeState::Removing:
         putAway(volume, fileSystem->name);
-        discard(volume.uuid);
+        if (kindOf(host_.places.lumos(), volume.uuid) != EntryKind::Nothing) {
+            discard(volume.uuid);
+            removedNow_.push_back(volume);
+        }
         break;
     case Store::VolumeState::Mounted:
     case Store::VolumeState::Unmounted:

@@ -23,7 +23,11 @@ public:
 
     /// Finishes what others left unfinished.
     /// @return the records that are now known to be done, for Store::HostStore::putVolumes
-    std::vector<Store::Volume> finishUnsettled();
+    std::vector<Store::Volume> const &finishUnsettled();
+    /// Of those, the removals that had really been cut off: their content is gone only now.
+    std::vector<Store::Volume> const &removedNow() const {
+        return removedNow_;
+    }
 
     /// Makes sure that mounting can succeed: the content's directory exists, and nothing stands where it is to appear.
     void prepareMount(Store::Volume const &volume, std::string const &containerName);
@@ -38,6 +42,8 @@ private:
 
     Host &host_;
     DirectoryLock lock_;
+    std::vector<Store::Volume> settled_;
+    std::vector<Store::Volume> removedNow_;
 };
 
 } // namespace Kestrel
