@@ -17,7 +17,7 @@ namespace {
 std::string readAll(std::istream &stream, std::string const &name) {
     std::string text{std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
     if (stream.bad()) {
-        throw Wire::Failure(Wire::ErrorCode::IoError, "The topology \"" + name + "\" cannot be read");
+        throw Wire::Failure(Wire::ErrorCode::IoError, "the topology '" + name + "' cannot be read");
     }
     return text;
 }
@@ -32,7 +32,7 @@ std::string readTopology(std::string const &path, Console const &console) {
     if (!file || file.peek() == std::ifstream::traits_type::eof()) {
         int const reason = errno;
         if (reason != 0) {
-            throw Wire::Failure(Wire::ErrorCode::IoError, "The topology \"" + path + "\" cannot be read: " +
+            throw Wire::Failure(Wire::ErrorCode::IoError, "the topology '" + path + "' cannot be read: " +
                                                               std::generic_category().message(reason));
         }
     }

@@ -45,7 +45,7 @@ void dispatch(Words const &words, Console const &console) {
     auto const command = std::find_if(commands.begin(), commands.end(),
                                       [&](auto const &candidate) { return words.front() == candidate.name; });
     if (command == commands.end()) {
-        throw UsageError("there is no command \"" + words.front() + "\"");
+        throw UsageError("there is no command '" + words.front() + "'");
     }
     command->execute(Words(words.begin() + 1, words.end()), console);
 }

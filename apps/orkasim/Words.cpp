@@ -16,7 +16,7 @@ SortedWords::SortedWords(Words const &words, Words const &known) {
         } else if (std::find(known.begin(), known.end(), word) != known.end()) {
             flags_.push_back(word);
         } else {
-            throw UsageError("there is no option \"" + word + "\"");
+            throw UsageError("there is no option '" + word + "'");
         }
     }
 }
@@ -30,7 +30,7 @@ Words const &SortedWords::named(Words const &names) const {
         throw UsageError(names[rest_.size()] + " is missing");
     }
     if (rest_.size() > names.size()) {
-        throw UsageError("\"" + rest_[names.size()] + "\" is one word too many");
+        throw UsageError("'" + rest_[names.size()] + "' is one word too many");
     }
     return rest_;
 }

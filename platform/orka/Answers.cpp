@@ -28,7 +28,7 @@ std::optional<RememberedAnswer> recall(Sqlite::Database &database, std::string c
     }
     if (row.textView(0) != request) {
         throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
-                            "The idempotency key " + key + " was used for another request already");
+                            "the idempotency key " + key + " was used for another request already");
     }
     RememberedAnswer answer;
     if (!row.isNull(1)) {

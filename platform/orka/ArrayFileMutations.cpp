@@ -25,27 +25,27 @@ Wire::Failure invalid(std::string sentence) {
 
 void checkSpec(VolumeSpec const &spec) {
     if (spec.kind == VolumeKind::Config && spec.directoryName.empty()) {
-        throw invalid("A config volume needs a directory name");
+        throw invalid("a config volume needs a directory name");
     }
     if (spec.kind == VolumeKind::Data && !spec.directoryName.empty()) {
-        throw invalid("A data volume has no directory name, but \"" + spec.directoryName + "\" was given");
+        throw invalid("a data volume has no directory name, but '" + spec.directoryName + "' was given");
     }
     for (auto const *text : {&spec.directoryName, &spec.vmUuid}) {
         if (text->find('\0') != std::string::npos) {
-            throw invalid("A virtual volume's texts cannot hold the character NUL");
+            throw invalid("a virtual volume's texts cannot hold the character NUL");
         }
     }
     if (spec.profile && spec.profile->find('\0') != std::string::npos) {
-        throw invalid("A virtual volume's texts cannot hold the character NUL");
+        throw invalid("a virtual volume's texts cannot hold the character NUL");
     }
 }
 
 int64_t resolveSize(VolumeSpec const &spec, ContainerRow const &container) {
     if (spec.sizeMb < 0) {
-        throw invalid("A virtual volume cannot have a size of " + std::to_string(spec.sizeMb) + " MB");
+        throw invalid("a virtual volume cannot have a size of " + std::to_string(spec.sizeMb) + " MB");
     }
     if (spec.sizeMb > container.maxLumoSizeMb) {
-        throw Wire::Failure(Wire::ErrorCode::TooLarge, "A virtual volume of " + std::to_string(spec.sizeMb) +
+        throw Wire::Failure(Wire::ErrorCode::TooLarge, "a virtual volume of " + std::to_string(spec.sizeMb) +
                                                            " MB is larger than the storage container " +
                                                            spec.containerId + " allows (" +
                                                            std::to_string(container.maxLumoSizeMb) + " MB)");
@@ -57,9 +57,9 @@ void checkDirectoryNameIsFree(Sqlite::Database &database, VolumeSpec const &spec
     auto row = database.query("SELECT 1 FROM volume WHERE container = ? AND directory_name = ?");
     row.bind(1, container.seq).bind(2, spec.directoryName);
     if (row.step()) {
-        throw Wire::Failure(Wire::ErrorCode::AlreadyExists, "The storage container " + spec.containerId +
-                                                                " has a config volume \"" + spec.directoryName +
-                                                                "\" already");
+        throw Wire::Failure(Wire::ErrorCode::AlreadyExists, "the storage container " + spec.containerId +
+                                                                " has a config volume '" + spec.directoryName +
+                                                                "' already");
     }
 }
 
@@ -114,7 +114,7 @@ EndpointRow requireEndpoint(Sqlite::Database &database, VolumeRow const &volume,
                               "(SELECT container FROM volume WHERE seq = ?2))");
     row.bind(1, uid).bind(2, volume.seq);
     if (!row.step()) {
-        throw Wire::Failure(Wire::ErrorCode::NoSuchEndpoint, "No storage array of the storage container " +
+        throw Wire::Failure(Wire::ErrorCode::NoSuchEndpoint, "no storage array of the storage container " +
                                                                  volume.volume.containerId +
                                                                  " has a protocol endpoint " + uid);
     }
@@ -154,7 +154,7 @@ void ArrayFile::deleteVolume(std::string const &idempotencyKey, std::string cons
         }
         auto const row = requireVolume(*database_, containerId, uuid);
         if (row.volume.boundTo) {
-            throw Wire::Failure(Wire::ErrorCode::InUse, "The virtual volume " + row.volume.uuid +
+            throw Wire::Failure(Wire::ErrorCode::InUse, "the virtual volume " + row.volume.uuid +
                                                             " is bound to the protocol endpoint " +
                                                             *row.volume.boundTo);
         }
@@ -175,14 +175,14 @@ void ArrayFile::bindVolume(std::string const &idempotencyKey, std::string const 
         auto const row = requireVolume(*database_, containerId, uuid);
         auto const endpoint = requireEndpoint(*database_, row, endpointUid);
         if (row.volume.boundTo && *row.volume.boundTo != endpointUid) {
-            throw Wire::Failure(Wire::ErrorCode::InUse, "The virtual volume " + row.volume.uuid +
+            throw Wire::Failure(Wire::ErrorCode::InUse, "the virtual volume " + row.volume.uuid +
                                                             " is bound to the protocol endpoint " +
                                                             *row.volume.boundTo);
         }
         if (!row.volume.boundTo) {
             if (!endpoint.isAccessible) {
                 throw Wire::Failure(Wire::ErrorCode::NoAccessibleEndpoint,
-                                    "The protocol endpoint " + endpointUid + " is not accessible");
+                                    "the protocol endpoint " + endpointUid + " is not accessible");
             }
             database_->query("UPDATE volume SET bound_to = ? WHERE seq = ?")
                 .bind(1, endpoint.seq)

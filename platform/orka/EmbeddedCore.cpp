@@ -51,12 +51,12 @@ EmbeddedProvider::Core::VersionedInventory EmbeddedProvider::Core::inventory(Arr
 
 Wire::Failure EmbeddedProvider::Core::tooLate() const {
     return {Wire::ErrorCode::DeadlineExceeded,
-            "The deadline had passed before the array file \"" + path_ + "\" could be asked"};
+            "the deadline had passed before the array file '" + path_ + "' could be asked"};
 }
 
 Wire::Failure EmbeddedProvider::Core::stillLocked() const {
     return {Wire::ErrorCode::ProviderBusy,
-            "The array file \"" + path_ + "\" is busy: another process held its lock until the deadline"};
+            "the array file '" + path_ + "' is busy: another process held its lock until the deadline"};
 }
 
 } // namespace Orka

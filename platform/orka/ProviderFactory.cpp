@@ -11,7 +11,7 @@ namespace Orka {
 namespace {
 
 Wire::Failure badUrl(std::string const &url, std::string const &why) {
-    return {Wire::ErrorCode::InvalidArgument, "The provider URL \"" + url + "\" cannot be used: " + why};
+    return {Wire::ErrorCode::InvalidArgument, "the provider URL '" + url + "' cannot be used: " + why};
 }
 
 std::optional<unsigned> hexDigit(char character) {

@@ -18,7 +18,7 @@ std::string randomUuid() {
         given = getrandom(bytes.data(), bytes.size(), 0);
     } while (given < 0 && errno == EINTR);
     if (given != static_cast<ssize_t>(bytes.size())) {
-        throw Wire::Failure(Wire::ErrorCode::InternalError, "The kernel gave no random bytes for a new volume's id.");
+        throw Wire::Failure(Wire::ErrorCode::InternalError, "the kernel gave no random bytes for a new volume's id");
     }
     bytes[6] = static_cast<uint8_t>((bytes[6] & 0x0f) | 0x40);
     bytes[8] = static_cast<uint8_t>((bytes[8] & 0x3f) | 0x80);

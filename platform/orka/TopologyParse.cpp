@@ -39,7 +39,7 @@ private:
     using Places = std::unordered_map<std::string, size_t>;
 
     void readArray(JsonNode const &node);
-    Endpoint readEndpoint(JsonNode const &node);
+    Endpoint readEndpoint(JsonNode const &node, std::string const &arrayId);
     void readTransport(JsonObject const &object, JsonNode const &type, Endpoint &endpoint);
     void readContainer(JsonNode const &node);
     void readVolume(JsonNode const &node, StorageContainer const &container);
@@ -76,22 +76,21 @@ void TopologyReader::readArray(JsonNode const &node) {
     array.name = object.textOr("name", "");
     array.vendorId = object.textOr("vendorId", "");
     array.modelId = object.textOr("modelId", "");
-    object.each("endpoints", [&](JsonNode const &element) {
-        array.endpoints.push_back(readEndpoint(element));
-        auto const &uid = array.endpoints.back().uid;
-        if (uid && !arrayOfEndpoint_.emplace(*uid, array.id).second) {
-            element.fail("another protocol endpoint has the uid " + quoted(*uid));
-        }
-    });
+    object.each("endpoints",
+                [&](JsonNode const &element) { array.endpoints.push_back(readEndpoint(element, array.id)); });
     topology_.arrays.push_back(std::move(array));
 }
 
-Endpoint TopologyReader::readEndpoint(JsonNode const &node) {
+Endpoint TopologyReader::readEndpoint(JsonNode const &node, std::string const &arrayId) {
     JsonObject const object(
         node, {"uid", "type", "lunId", "ipAddress", "addresses", "serverMount", "accessible", "configured"});
     Endpoint endpoint;
     if (object.has("uid")) {
-        endpoint.uid = object.at("uid").name();
+        auto const uid = object.at("uid");
+        endpoint.uid = uid.name();
+        if (!arrayOfEndpoint_.emplace(*endpoint.uid, arrayId).second) {
+            uid.fail("another protocol endpoint has the uid " + quoted(*endpoint.uid));
+        }
     }
     endpoint.isAccessible = object.booleanOr("accessible", true);
     endpoint.isConfigured = object.booleanOr("configured", true);

@@ -31,7 +31,7 @@ namespace {
         code = Wire::ErrorCode::FileReadOnly;
     }
     throw Wire::Failure(code,
-                        "The array file \"" + path + "\" cannot be made: " + std::generic_category().message(error));
+                        "the array file '" + path + "' cannot be made: " + std::generic_category().message(error));
 }
 
 bool exists(std::string const &path) {
@@ -94,12 +94,12 @@ std::unique_ptr<Sqlite::Database> holdForReplacement(std::string const &path) {
 
 void refuseToReplace(std::string const &path) {
     if (exists(path)) {
-        throw Wire::Failure(Wire::ErrorCode::AlreadyExists, "\"" + path + "\" exists already");
+        throw Wire::Failure(Wire::ErrorCode::AlreadyExists, "'" + path + "' exists already");
     }
     if (exists(path + "-journal")) {
         throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
-                            "\"" + path + "-journal\" exists already and belongs to a file \"" + path +
-                                "\" that is gone; put that file back, or move its journal away");
+                            "'" + path + "-journal' exists already and belongs to a file '" + path +
+                                "' that is gone; put that file back, or move its journal away");
     }
 }
 

@@ -24,7 +24,7 @@ ContainerRow requireContainer(Sqlite::Database &database, std::string const &con
     auto row = database.query("SELECT seq, max_lumo_size_mb FROM container WHERE id = ?");
     row.bind(1, Wire::normalizeContainerId(containerId).value_or(containerId));
     if (!row.step()) {
-        throw Wire::Failure(Wire::ErrorCode::NoSuchContainer, "There is no storage container " + containerId);
+        throw Wire::Failure(Wire::ErrorCode::NoSuchContainer, "there is no storage container " + containerId);
     }
     return {row.integer(0), row.integer(1)};
 }
@@ -51,7 +51,7 @@ VolumeRow requireVolume(Sqlite::Database &database, std::string const &container
     row.bind(1, Wire::normalizeContainerId(uuid).value_or(uuid)).bind(2, container.seq);
     if (!row.step()) {
         throw Wire::Failure(Wire::ErrorCode::NoSuchVolume,
-                            "There is no virtual volume " + uuid + " in the storage container " + containerId);
+                            "there is no virtual volume " + uuid + " in the storage container " + containerId);
     }
     return {row.integer(0), volumeOf(row)};
 }

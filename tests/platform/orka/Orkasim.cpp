@@ -1,0 +1,154 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "Fixture.h"
+
+#include <filesystem>
+#include <sstream>
+
+#include "Run.h"
+
+namespace {
+
+class OrkasimTest : public OrkaTest {
+protected:
+    OrkasimTest() {
+        writeBytes(at("t.json"), sampleTopology());
+    }
+
+    int run(Orkasim::Words const &words, std::string const &input = "") {
+        std::istringstream in(input);
+        std::ostringstream out;
+        std::ostringstream err;
+        auto const status = Orkasim::run(words, {in, out, err});
+        out_ = out.str();
+        err_ = err.str();
+        return static_cast<int>(status);
+    }
+
+    std::string out_;
+    std::string err_;
+};
+
+std::string const usage =
+    "usage:\n"
+    "  orkasim make [--force] TOPOLOGY ARRAYFILE\n"
+    "      makes an array file from a topology in JSON (- reads standard input); --force replaces "
+    "an array file\n"
+    "  orkasim show ARRAYFILE\n"
+    "      tells how much an array file holds\n";
+
+} // namespace
+
+TEST_F(OrkasimTest, makesAnArrayFileSilently) {
+    EXPECT_EQ(run({"make", at("t.json"), at("x.array")}), 0);
+    EXPECT_EQ(out_ + err_, "");
+    EXPECT_EQ(Orka::ArrayFile(at("x.array")).counts().arrays, 2);
+}
+
+TEST_F(OrkasimTest, readsATopologyFromStandardInput) {
+    EXPECT_EQ(run({"make", "-", at("x.array")}, sampleTopology()), 0);
+    EXPECT_EQ(Orka::ArrayFile(at("x.array")).counts().arrays, 2);
+    EXPECT_EQ(run({"make", "-", at("y.array")}, "{"), 1);
+    EXPECT_EQ(err_, "orkasim: standard input: line 1, column 2: Missing a name for object member.\n");
+}
+
+TEST_F(OrkasimTest, replacesAnArrayFileOnlyByForce) {
+    ASSERT_EQ(run({"make", at("t.json"), at("x.array")}), 0);
+    EXPECT_EQ(run({"make", "-", at("x.array")}, R"({"arrays": []})"), 1);
+    EXPECT_EQ(err_, "orkasim: '" + at("x.array") + "' exists already\n");
+    EXPECT_EQ(Orka::ArrayFile(at("x.array")).counts().arrays, 2);
+    EXPECT_EQ(run({"make", "--force", "-", at("x.array")}, R"({"arrays": []})"), 0);
+    EXPECT_EQ(Orka::ArrayFile(at("x.array")).counts().arrays, 0);
+}
+
+TEST_F(OrkasimTest, tellsWhereATopologyIsWrongAndMakesNothing) {
+    writeBytes(at("bad.json"), R"({"arrays": [{"id": ""}]})");
+    EXPECT_EQ(run({"make", at("bad.json"), at("x.array")}), 1);
+    EXPECT_EQ(err_, "orkasim: " + at("bad.json") + ": arrays[0].id: an empty text is not allowed here\n");
+    EXPECT_EQ(out_, "");
+    EXPECT_EQ(filesInDirectory(), (std::vector<std::string>{"bad.json", "t.json"}));
+}
+
+TEST_F(OrkasimTest, tellsWhyATopologyCannotBeRead) {
+    EXPECT_EQ(run({"make", at("none.json"), at("x.array")}), 1);
+    EXPECT_EQ(err_, "orkasim: the topology '" + at("none.json") + "' cannot be read: No such file or directory\n");
+    EXPECT_EQ(run({"make", directory_, at("x.array")}), 1);
+    EXPECT_EQ(err_, "orkasim: the topology '" + directory_ + "' cannot be read: Is a directory\n");
+    writeBytes(at("empty.json"), "");
+    EXPECT_EQ(run({"make", at("empty.json"), at("x.array")}), 1);
+    EXPECT_EQ(err_, "orkasim: " + at("empty.json") + ": line 1, column 1: The document is empty.\n");
+}
+
+TEST_F(OrkasimTest, showsWhatAnArrayFileHolds) {
+    makeArray("x.array");
+    Orka::ArrayFile(at("x.array")).setHostContext("ne\x1bxa");
+    EXPECT_EQ(run({"show", at("x.array")}), 0);
+    EXPECT_EQ(out_, "Array file:          " + at("x.array") +
+                        "\n"
+                        "Storage arrays:      2\n"
+                        "Protocol endpoints:  6\n"
+                        "Storage containers:  2\n"
+                        "Config volumes:      2\n"
+                        "Data volumes:        1\n"
+                        "Bound volumes:       1\n"
+                        "Metadata pairs:      3\n"
+                        "Host's context:      ne\\x1bxa\n");
+    EXPECT_EQ(err_, "");
+}
+
+TEST_F(OrkasimTest, showsWhyAFileIsNoArrayFile) {
+    EXPECT_EQ(run({"show", at("x.array")}), 1);
+    EXPECT_EQ(err_, "orkasim: the array file '" + at("x.array") + "' does not exist\n");
+    EXPECT_EQ(run({"show", at("t.json")}), 1);
+    EXPECT_EQ(err_,
+              "orkasim: the array file '" + at("t.json") + "' is damaged: it does not begin as a database file does\n");
+}
+
+TEST_F(OrkasimTest, showsNamesWithControlCharactersHarmlessly) {
+    EXPECT_EQ(run({"show", "/no\x1b[2Jsuch\nfile"}), 1);
+    EXPECT_EQ(err_, "orkasim: the array file '/no\\x1b[2Jsuch\\x0afile' does not exist\n");
+}
+
+TEST_F(OrkasimTest, tellsWhatIsWrongWithTheWords) {
+    struct Case {
+        Orkasim::Words words;
+        char const *sentence;
+    };
+    for (auto const &[words, sentence] : std::vector<Case>{
+             {{}, "a command is missing"},
+             {{"serve-me"}, "there is no command 'serve-me'"},
+             {{"make"}, "TOPOLOGY is missing"},
+             {{"make", "a"}, "ARRAYFILE is missing"},
+             {{"make", "a", "b", "c"}, "'c' is one word too many"},
+             {{"make", "--fast", "a", "b"}, "there is no option '--fast'"},
+             {{"show"}, "ARRAYFILE is missing"},
+             {{"show", "--force", "a"}, "there is no option '--force'"},
+         }) {
+        EXPECT_EQ(run(words), 2);
+        EXPECT_EQ(err_, std::string("orkasim: ") + sentence + "\n" + usage);
+        EXPECT_EQ(out_, "");
+    }
+}
+
+TEST_F(OrkasimTest, helpsWhenAsked) {
+    EXPECT_EQ(run({"--help"}), 0);
+    EXPECT_EQ(out_, usage);
+    EXPECT_EQ(run({"make", "-h"}), 0);
+    EXPECT_EQ(out_, usage);
+}
+
+TEST_F(OrkasimTest, takesAWordAfterTheDashesAsAName) {
+    auto const path = std::filesystem::relative(at("x.array"));
+    EXPECT_EQ(run({"make", "--", at("t.json"), path}), 0);
+    EXPECT_EQ(run({"show", "--", "--help"}), 1);
+    EXPECT_EQ(err_, "orkasim: the array file '--help' does not exist\n");
+}
+
+TEST_F(OrkasimTest, saysWhenTheOutputCannotBeWritten) {
+    makeArray("x.array");
+    std::istringstream in;
+    std::ostringstream out;
+    std::ostringstream err;
+    out.setstate(std::ios::badbit);
+    EXPECT_EQ(static_cast<int>(Orkasim::run({"show", at("x.array")}, {in, out, err})), 4);
+    EXPECT_EQ(err.str(), "orkasim: the output could not be written\n");
+}
