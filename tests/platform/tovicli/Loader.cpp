@@ -72,7 +72,7 @@ TEST_F(Loader, AbsentDirectoryIsATrouble) {
 
 TEST_F(Loader, fault_7_NothingIsLoadedFromADirectoryThatOthersCanWrite) {
     directory.addPlugin("behaves", "a.so");
-    for (mode_t const mode : {0777, 0770, 01777, 0720}) {
+    for (mode_t const mode : {0777U, 0770U, 01777U, 0720U}) {
         chmod(directory.path().c_str(), mode);
         PluginLoader fresh("/nonexistent", geteuid());
         EXPECT_THAT(fresh.registerInto(root, directory.path(), environment).troubles,

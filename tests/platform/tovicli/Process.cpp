@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // What only the real process shows: descriptors, signals, exit status.
-#include <cerrno>
 #include <csignal>
 #include <fcntl.h>
 #include <functional>
@@ -11,52 +10,32 @@
 #include <unistd.h>
 #include <vector>
 
-#include "TemporaryDirectory.h"
+#include "ProcessRun.h"
 
 namespace {
 
-using ::testing::HasSubstr;
 using ::testing::StartsWith;
 
 class Process : public ::testing::Test {
 protected:
-    /// Runs the tool with the test plug-in. Standard output and error go to files.
-    /// @param arrange called in the new process before the tool starts
-    /// @return the exit status, or minus the signal that ended it
+    /// Runs the tool with the test plug-in.
     int run(
         std::vector<std::string> words, std::function<void()> const &arrange = [] {}) {
-        words.insert(words.begin(), {TEST_TOVICLI, "--plugins", plugins.path()});
-        std::vector<char *> arguments;
-        for (std::string &word : words) {
-            arguments.push_back(word.data());
-        }
-        arguments.push_back(nullptr);
-        pid_t const child = fork();
-        if (child == 0) {
-            signal(SIGINT, SIG_DFL);
-            dup2(open((files / "out").c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), STDOUT_FILENO);
-            dup2(open((files / "err").c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), STDERR_FILENO);
-            arrange();
-            execv(TEST_TOVICLI, arguments.data());
-            _exit(127);
-        }
-        int status = 0;
-        while (waitpid(child, &status, 0) == -1 && errno == EINTR) {
-        }
-        return WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
+        words.insert(words.begin(), {"--plugins", plugins.path()});
+        return process.run(TEST_TOVICLI, words, arrange);
     }
     std::string output() {
-        return readFile(files / "out");
+        return process.output();
     }
     std::string errors() {
-        return readFile(files / "err");
+        return process.errors();
     }
 
     Process() {
         plugins.addPlugin("behaves", "behaves.so");
     }
     TemporaryDirectory plugins;
-    TemporaryDirectory files;
+    ProcessRun process;
 };
 
 TEST_F(Process, RunsACommandOfAPlugin) {
