@@ -3,6 +3,8 @@
 // A table of mistakes and of what is said about each.
 #include "Fixture.h"
 
+#include <ostream>
+
 #include "wire/Failure.h"
 
 namespace {
@@ -12,6 +14,11 @@ struct Mistake {
     std::string json;
     std::string sentence;
 };
+
+/// Without it, a test's name would hold the bytes of the structure, addresses among them.
+std::ostream &operator<<(std::ostream &stream, Mistake const &mistake) {
+    return stream << mistake.name;
+}
 
 std::string withEndpoint(std::string const &endpoint) {
     return R"({"arrays": [{"id": "a", "endpoints": [)" + endpoint + "]}]}";
