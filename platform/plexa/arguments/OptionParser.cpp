@@ -162,6 +162,9 @@ void OptionParser::requireAll(Group const &group) {
 }
 
 OptionParser::Target const *OptionParser::find(std::string_view option) const {
+    if (!option.starts_with('-')) {
+        return nullptr; // a value or a part of the path, an empty one perhaps
+    }
     bool const isLong = option.starts_with("--");
     std::string_view const name = option.substr(isLong ? 2 : 1);
     for (Target const &target : targets_) {

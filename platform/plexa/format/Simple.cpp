@@ -97,6 +97,14 @@ private:
 } // namespace
 
 void writeSimple(Result const &result, FormatSettings const &settings, Sink &sink) {
+    // A text that is the whole result may bring its line end along.
+    if (auto const text = boost::dynamic_pointer_cast<MetaString>(result.value);
+        text != nullptr && text->IsSet() && text->GetValue().ends_with('\n')) {
+        std::string line = text->GetValue();
+        line.pop_back();
+        SimpleWriter(settings, sink).value(MetaString::New(line), result.schema, 0);
+        return;
+    }
     SimpleWriter(settings, sink).value(result.value, result.schema, 0);
 }
 

@@ -193,6 +193,16 @@ TEST(Options, TheFirstGroupThatDeclaresANameHasIt) {
     EXPECT_EQ(other->GetString("format"), "json");
 }
 
+TEST(Options, WordsThatAreNoOptionsAreNotKnown) {
+    OptionParser const parser({{declaration(), CallSpec::Input::New()}});
+    EXPECT_TRUE(parser.knows("-c"));
+    EXPECT_TRUE(parser.knows("--clear=no"));
+    EXPECT_FALSE(parser.knows(""));
+    EXPECT_FALSE(parser.knows("-"));
+    EXPECT_FALSE(parser.knows("--"));
+    EXPECT_FALSE(parser.knows("xc"));
+}
+
 TEST(Options, ManyValuesOfAListAreReadInOnePass) {
     std::vector<std::string> words;
     for (int i = 0; i < 50000; ++i) {

@@ -14,6 +14,11 @@ TEST(Simple, ScalarIsALine) {
     EXPECT_EQ(format("simple", {MetaString::New("done"), MetaString::New()}), "done\n");
 }
 
+TEST(Simple, TextThatBringsItsLineEndIsALineToo) {
+    EXPECT_EQ(format("simple", {MetaString::New("done\n"), MetaString::New()}), "done\n");
+    EXPECT_EQ(format("simple", {MetaString::New("a\nb\n"), MetaString::New()}), "a\\nb\n");
+}
+
 TEST(Simple, UnsetOrAbsentValueIsNothing) {
     EXPECT_EQ(format("simple", {MetaString::New(), MetaString::New()}), "");
     EXPECT_EQ(format("simple", {nullptr, MetaString::New()}), "");
