@@ -86,7 +86,8 @@ void ConfigVolumes::place(LumoClient::Volume const &bound, bool &mountedBefore) 
     requireDirectoryName(bound.uuid, "volume uuid");
     requireDirectoryName(bound.directoryName, "directory name");
     VolumeDirectories directories(host_);
-    auto const settled = directories.finishUnsettled();
+    Store::HostStore::Change change(host_.store);
+    auto const &settled = directories.finishUnsettled();
     if (auto const record = host_.store.volume(bound.uuid); record && isMounted(*record)) {
         mountedBefore = true;
         throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
@@ -96,6 +97,7 @@ void ConfigVolumes::place(LumoClient::Volume const &bound, bool &mountedBefore) 
     Store::Volume const volume{bound.uuid, containerId_, bound.directoryName, Store::VolumeState::Mounting};
     directories.prepareMount(volume, containerName_);
     host_.store.putVolumes({volume}, settled);
+    change.commit();
     try {
         directories.bringOut(volume, containerName_);
     } catch (Wire::Failure const &) {
@@ -106,13 +108,12 @@ void ConfigVolumes::place(LumoClient::Volume const &bound, bool &mountedBefore) 
 
 void ConfigVolumes::unmount(std::string const &name, std::string const &uuid) {
     LumoClient::VolumeKey const key = keyOf(name, uuid);
-    std::vector<Store::Volume> settled;
-    Store::Volume volume;
-    {
-        VolumeDirectories directories(host_);
-        settled = directories.finishUnsettled();
-        volume = requireMounted(key);
+    auto record = recordOf(key);
+    if (!record || !isMounted(*record)) {
+        VolumeDirectories(host_).finishUnsettled(); // an unmount that was killed still has its directory to put away
+        record = requireMounted(key);
     }
+    Store::Volume const volume = *record;
     try {
         // Not under the lock: an answer may take as long as the timeout.
         host_.client.unbindVirtualVolume({containerId_, volume.uuid, {}}, channel_);
@@ -124,8 +125,13 @@ void ConfigVolumes::unmount(std::string const &name, std::string const &uuid) {
     }
     try {
         VolumeDirectories directories(host_);
-        volume = requireMounted({containerId_, volume.uuid, {}});
-        host_.store.putVolumes({inState(volume, Store::VolumeState::Unmounting)}, settled);
+        {
+            Store::HostStore::Change change(host_.store);
+            auto const &settled = directories.finishUnsettled();
+            requireMounted({containerId_, volume.uuid, {}}); // still
+            host_.store.putVolumes({inState(volume, Store::VolumeState::Unmounting)}, settled);
+            change.commit();
+        }
         try {
             directories.putAway(volume, containerName_);
         } catch (Wire::Failure const &) {
@@ -146,7 +152,7 @@ void ConfigVolumes::remove(std::string const &name, std::string const &uuid) {
     bool finishedNow = false;
     {
         VolumeDirectories directories(host_);
-        auto const settled = directories.finishUnsettled();
+        auto const &settled = directories.finishUnsettled();
         finishedNow = hasNamed(directories.removedNow(), key);
         here = recordsOf(key, settled);
     }
@@ -189,7 +195,7 @@ void ConfigVolumes::forget(Store::Volume const &volume) {
     try {
         requireDirectoryName(volume.uuid, "volume uuid");
         VolumeDirectories directories(host_);
-        auto const settled = directories.finishUnsettled();
+        auto const &settled = directories.finishUnsettled();
         if (auto const record = host_.store.volume(volume.uuid); record) {
             host_.store.putVolumes({inState(*record, Store::VolumeState::Removing)}, settled);
             directories.putAway(*record, containerName_);

@@ -28,10 +28,10 @@ VolumeDirectories::VolumeDirectories(Host &host)
 std::vector<Store::Volume> const &VolumeDirectories::finishUnsettled() {
     settled_.clear();
     removedNow_.clear();
-    for (Store::Volume const &volume : host_.store.unsettledVolumes()) {
+    for (Store::UnsettledVolume const &unsettled : host_.store.unsettledVolumes()) {
         try {
-            finish(volume);
-            settled_.push_back(volume);
+            finish(unsettled.volume, unsettled.containerName);
+            settled_.push_back(unsettled.volume);
         } catch (Wire::Failure const &) {
             // Something stands in its way. It stays unsettled, and an operation on that volume says why; others go on.
         }
@@ -39,20 +39,16 @@ std::vector<Store::Volume> const &VolumeDirectories::finishUnsettled() {
     return settled_;
 }
 
-void VolumeDirectories::finish(Store::Volume const &volume) {
-    auto const fileSystem = host_.store.fileSystem(volume.containerId);
-    if (!fileSystem) {
-        return; // Removed by another process just now, and the volume's record with it.
-    }
+void VolumeDirectories::finish(Store::Volume const &volume, std::string const &containerName) {
     switch (volume.state) {
     case Store::VolumeState::Mounting:
-        bringOut(volume, fileSystem->name);
+        bringOut(volume, containerName);
         break;
     case Store::VolumeState::Unmounting:
-        putAway(volume, fileSystem->name);
+        putAway(volume, containerName);
         break;
     case Store::VolumeState::Removing:
-        putAway(volume, fileSystem->name);
+        putAway(volume, containerName);
         if (kindOf(host_.places.lumos(), volume.uuid) != EntryKind::Nothing) {
             discard(volume.uuid);
             removedNow_.push_back(volume);
@@ -64,8 +60,16 @@ void VolumeDirectories::finish(Store::Volume const &volume) {
     }
 }
 
+Directory const &VolumeDirectories::container(std::string const &name) {
+    if (!container_.descriptor || containerName_ != name) {
+        container_ = host_.places.container(name);
+        containerName_ = name;
+    }
+    return container_;
+}
+
 void VolumeDirectories::prepareMount(Store::Volume const &volume, std::string const &containerName) {
-    Directory const container = host_.places.container(containerName);
+    Directory const &container = this->container(containerName);
     if (kindOf(container, volume.directoryName) != EntryKind::Nothing) {
         refuseInTheWay(container.pathOf(volume.directoryName));
     }
@@ -77,7 +81,7 @@ void VolumeDirectories::prepareMount(Store::Volume const &volume, std::string co
 
 void VolumeDirectories::bringOut(Store::Volume const &volume, std::string const &containerName) {
     Directory const &lumos = host_.places.lumos();
-    Directory const container = host_.places.container(containerName);
+    Directory const &container = this->container(containerName);
     switch (moveTo(lumos, volume.uuid, container, volume.directoryName)) {
     case Outcome::Done:
         return;
@@ -94,10 +98,7 @@ void VolumeDirectories::bringOut(Store::Volume const &volume, std::string const 
 
 void VolumeDirectories::putAway(Store::Volume const &volume, std::string const &containerName) {
     Directory const &lumos = host_.places.lumos();
-    Directory const container = openIn(host_.places.volumes(), containerName);
-    if (!container.descriptor) {
-        return;
-    }
+    Directory const &container = this->container(containerName);
     switch (kindOf(container, volume.directoryName)) {
     case EntryKind::Nothing:
         return;

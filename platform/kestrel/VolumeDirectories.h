@@ -38,12 +38,16 @@ public:
     void discard(std::string const &uuid);
 
 private:
-    void finish(Store::Volume const &volume);
+    void finish(Store::Volume const &volume, std::string const &containerName);
+    /// volumes/<container>, made when it is missing, and kept open for the next step.
+    Directory const &container(std::string const &name);
 
     Host &host_;
     DirectoryLock lock_;
     std::vector<Store::Volume> settled_;
     std::vector<Store::Volume> removedNow_;
+    Directory container_;
+    std::string containerName_;
 };
 
 } // namespace Kestrel

@@ -4,6 +4,7 @@
 #include "Schema.h"
 #include "Translate.h"
 #include "sqlite/Database.h"
+#include "sqlite/Transaction.h"
 #include "store/Directory.h"
 #include "wire/Paths.h"
 
@@ -18,7 +19,7 @@ HostStore::HostStore(std::string const &root, Mode mode, std::chrono::millisecon
 HostStore::~HostStore() = default;
 
 Sqlite::Database *HostStore::reader() {
-    if (database_ && database_->hasMoved()) {
+    if (database_ && !changing_ && database_->hasMoved()) {
         database_.reset();
         ++generation_;
     }
@@ -49,6 +50,21 @@ Sqlite::Database &HostStore::writer() {
         ++generation_;
     }
     return *database_;
+}
+
+HostStore::Change::Change(HostStore &store)
+    : store_(store) {
+    translated([this] { transaction_ = std::make_unique<Sqlite::Transaction>(store_.writer()); });
+    store_.changing_ = true;
+}
+
+HostStore::Change::~Change() {
+    store_.changing_ = false;
+}
+
+void HostStore::Change::commit() {
+    store_.changing_ = false;
+    translated([this] { transaction_->commit(); });
 }
 
 int64_t HostStore::dataVersion() {

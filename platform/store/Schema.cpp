@@ -43,8 +43,9 @@ CREATE TABLE volume (
     directory_name TEXT NOT NULL,
     state INTEGER NOT NULL CHECK (state BETWEEN 0 AND 4)
 ) STRICT;
-CREATE UNIQUE INDEX volume_mounted ON volume(file_system, directory_name) WHERE state IN (0, 2);
-CREATE INDEX volume_put_away ON volume(file_system, directory_name) WHERE state IN (1, 3, 4);
+-- That a name is mounted once a container is checked by the writer: a unique index over the mounted ones would have to be
+-- written at each mount and unmount.
+CREATE INDEX volume_name ON volume(file_system, directory_name);
 CREATE INDEX volume_unsettled ON volume(id) WHERE state IN (2, 3, 4);
 
 CREATE TABLE endpoint_outage (

@@ -129,17 +129,21 @@ std::vector<Volume> HostStore::unmountedVolumes(std::string_view containerId, st
     });
 }
 
-std::vector<Volume> HostStore::unsettledVolumes() {
+std::vector<UnsettledVolume> HostStore::unsettledVolumes() {
     return translated([this] {
+        std::vector<UnsettledVolume> volumes;
         Sqlite::Database *const database = reader();
         if (database == nullptr) {
-            return std::vector<Volume>();
+            return volumes;
         }
         Sqlite::Query query(*database,
-                            "SELECT v.uuid, f.container_id, v.directory_name, v.state "
+                            "SELECT v.uuid, f.container_id, v.directory_name, v.state, f.name "
                             "FROM volume v INDEXED BY volume_unsettled JOIN file_system f ON f.id = v.file_system "
                             "WHERE v.state IN (2, 3, 4) ORDER BY v.id");
-        return readAll(query);
+        while (query.step()) {
+            volumes.push_back({readVolume(query), query.text(4)});
+        }
+        return volumes;
     });
 }
 
@@ -149,14 +153,19 @@ void HostStore::putVolumes(std::vector<Volume> const &volumes, std::vector<Volum
     }
     translated([&] {
         Sqlite::Database &database = writer();
-        Sqlite::Transaction transaction(database);
+        std::optional<Sqlite::Transaction> own;
+        if (!changing_) {
+            own.emplace(database);
+        }
         for (Volume const &volume : settled) {
             settle(database, volume);
         }
         for (Volume const &volume : volumes) {
             put(database, volume);
         }
-        transaction.commit();
+        if (own) {
+            own->commit();
+        }
     });
 }
 

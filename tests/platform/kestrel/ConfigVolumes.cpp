@@ -243,7 +243,7 @@ TEST_F(ConfigVolumesTest, RemoveDeletesADeepTree) {
     mount("dir");
     auto const before = fs::current_path();
     fs::current_path(at("volumes/gold/dir"));
-    for (int depth = 0; depth < 3000; ++depth) {
+    for (int depth = 0; depth < 1500; ++depth) {
         fs::create_directory("dddd");
         writeFile("file", "x");
         fs::current_path("dddd");

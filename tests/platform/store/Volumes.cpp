@@ -56,7 +56,8 @@ TEST_F(VolumesTest, SettlingGoesWithTheNextWrite) {
     Volume const unmounting = volume("v2", "two", VolumeState::Unmounting);
     Volume const removing = volume("v3", "three", VolumeState::Removing);
     store_.putVolumes({mounting, unmounting, removing}, {});
-    EXPECT_EQ(store_.unsettledVolumes(), (std::vector<Volume>{mounting, unmounting, removing}));
+    EXPECT_EQ(store_.unsettledVolumes(),
+              (std::vector<Store::UnsettledVolume>{{mounting, "c"}, {unmounting, "c"}, {removing, "c"}}));
     store_.putVolumes({volume("v4", "four", VolumeState::Mounting)}, {mounting, unmounting, removing});
     EXPECT_EQ(store_.volume("v1")->state, VolumeState::Mounted);
     EXPECT_EQ(store_.volume("v2")->state, VolumeState::Unmounted);
@@ -98,6 +99,28 @@ TEST_F(VolumesTest, BelongToAMountedContainer) {
     ASSERT_TRUE(failure);
     EXPECT_EQ(failure->code(), Wire::ErrorCode::NoSuchContainer);
     EXPECT_EQ(failure->sentence(), "the storage container id-9 is not mounted on this host");
+}
+
+TEST_F(VolumesTest, AChangeIsOneTransactionAndUndoneUnlessCommitted) {
+    HostStore other(root_, HostStore::Mode::ReadWrite, std::chrono::milliseconds{0});
+    {
+        HostStore::Change change(store_);
+        EXPECT_FALSE(store_.volume("v1"));
+        store_.putVolumes({volume("v1", "one", VolumeState::Mounting)}, {});
+        EXPECT_TRUE(store_.volume("v1"));
+        EXPECT_FALSE(other.volume("v1"));
+        EXPECT_EQ(failureOf([&] { other.putVolumes({volume("v2", "two", VolumeState::Mounting)}, {}); })->code(),
+                  Wire::ErrorCode::FileBusy);
+    }
+    EXPECT_FALSE(store_.volume("v1"));
+    {
+        HostStore::Change change(store_);
+        store_.putVolumes({volume("v1", "one", VolumeState::Mounting)}, {});
+        change.commit();
+    }
+    EXPECT_TRUE(other.volume("v1"));
+    store_.putVolumes({volume("v2", "two", VolumeState::Mounting)}, {});
+    EXPECT_TRUE(other.volume("v2"));
 }
 
 } // namespace

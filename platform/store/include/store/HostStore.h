@@ -23,7 +23,8 @@
 
 namespace Sqlite {
 class Database;
-}
+class Transaction;
+} // namespace Sqlite
 
 namespace Store {
 
@@ -57,6 +58,22 @@ struct FileSystem {
 class HostStore {
 public:
     enum class Mode { ReadWrite, QueryOnly };
+
+    /// Makes what is asked of the store while it lives, and at most one putVolumes, a single transaction: nobody else
+    /// changes the store between a check and the record that depends on it. Undone unless committed. One at a time.
+    class Change {
+    public:
+        explicit Change(HostStore &store);
+        ~Change();
+        Change(Change const &) = delete;
+        Change &operator=(Change const &) = delete;
+        /// Durable when it returns.
+        void commit();
+
+    private:
+        HostStore &store_;
+        std::unique_ptr<Sqlite::Transaction> transaction_;
+    };
 
     /// Touches nothing.
     /// @param root        the directory that holds host.db
@@ -108,7 +125,7 @@ public:
     /// Those that are not mounted and had that directory name: at most a few.
     std::vector<Volume> unmountedVolumes(std::string_view containerId, std::string_view directoryName);
     /// Those whose directory may not be where their state says, because a process was killed on the way.
-    std::vector<Volume> unsettledVolumes();
+    std::vector<UnsettledVolume> unsettledVolumes();
     /// Writes the records and, in the same transaction, settles those that are known to be done (see VolumeState).
     /// Fails with AlreadyExists when the directory name of a mounted one is taken in its container.
     void putVolumes(std::vector<Volume> const &volumes, std::vector<Volume> const &settled);
@@ -133,6 +150,7 @@ private:
     /// Counts how often the file was opened or found gone: a part of dataVersion().
     int64_t generation_ = 0;
     std::unique_ptr<Sqlite::Database> database_;
+    bool changing_ = false;
 };
 
 } // namespace Store

@@ -28,6 +28,13 @@ struct Volume {
     bool operator==(Volume const &) const = default;
 };
 
+/// A config volume whose directory may be on its way, and the name under which its container is mounted.
+struct UnsettledVolume {
+    Volume volume;
+    std::string containerName;
+    bool operator==(UnsettledVolume const &) const = default;
+};
+
 /// A config volume that is mounted or about to be.
 struct Mount {
     std::string volumeUuid;
