@@ -21,6 +21,10 @@ struct Volume {
     char const *missingText;
 };
 
+void PrintTo(Volume const &volume, std::ostream *stream) {
+    *stream << volume.operation;
+}
+
 class ConfigVolume : public CommandTest, public testing::WithParamInterface<Volume> {
 protected:
     ConfigVolume() {

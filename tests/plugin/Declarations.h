@@ -4,6 +4,7 @@
 #pragma once
 
 #include <functional>
+#include <ostream>
 #include <string>
 #include <utility>
 #include <vector>
@@ -30,6 +31,11 @@ struct Declaration {
     /// The number that a failed constructor reports; 0 for a class whose constructor opens no session.
     unsigned sessionLine;
 };
+
+/// For the names that tests are listed under.
+inline void PrintTo(Declaration const &declaration, std::ostream *stream) {
+    *stream << declaration.className;
+}
 
 std::vector<Declaration> providerDeclarations();
 /// Storage containers and config volumes.

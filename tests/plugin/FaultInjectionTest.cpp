@@ -48,6 +48,10 @@ struct Rule {
     char const *refusedText;
 };
 
+void PrintTo(Rule const &rule, std::ostream *stream) {
+    *stream << rule.request;
+}
+
 class FaultRule : public CommandTest, public testing::WithParamInterface<Rule> {
 protected:
     FaultRule() {
@@ -200,6 +204,10 @@ struct Refused {
     char const *unit;
     unsigned line;
 };
+
+void PrintTo(Refused const &refused, std::ostream *stream) {
+    *stream << refused.unit;
+}
 
 class FaultSession : public CommandTest, public testing::WithParamInterface<Refused> {};
 
