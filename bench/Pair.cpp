@@ -5,8 +5,8 @@
 //
 //   bench_pair ROUNDS FIRST... -- SECOND...
 //
-// Both get an empty standard input and write nowhere. A command that fails ends the measurement: the time of a failure is
-// not the time of the work.
+// Both get an empty standard input and write nowhere. A command that fails ends the measurement: the time of a failure
+// is not the time of the work.
 #include <cerrno>
 #include <charconv>
 #include <chrono>

@@ -3,7 +3,8 @@
 // What the client library adds to the daemon's answer about all storage containers.
 //
 //   bench_query time ROUNDS   one line a round: nanoseconds through the library, nanoseconds for the raw bytes
-//   bench_query memory        one line: bytes of the records, bytes of heap they take, bytes the process grew at its peak
+//   bench_query memory        one line: bytes of the records, bytes of heap they take, bytes the process grew at its
+//   peak
 //
 // Both on the daemon of TOVI_ROOT. The raw side asks the same daemon the same question and reads the same replies.
 #include <chrono>

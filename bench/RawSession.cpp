@@ -62,7 +62,8 @@ void RawSession::prepare(std::function<void(Wire::Request::Builder)> const &fill
     replyCount_ = 0;
     for (bool last = false; !last; ++replyCount_) {
         size_t const size = readMessage();
-        auto const flat = kj::arrayPtr(reinterpret_cast<capnp::word const *>(buffer_.data()), size / sizeof(capnp::word));
+        auto const flat =
+            kj::arrayPtr(reinterpret_cast<capnp::word const *>(buffer_.data()), size / sizeof(capnp::word));
         capnp::ReaderOptions options;
         options.traversalLimitInWords = UINT64_MAX;
         capnp::FlatArrayMessageReader reader(flat, options);

@@ -12,8 +12,8 @@
 
 namespace Bench {
 
-/// The floor of every question to the daemon: a socket, one request that was serialized beforehand, and the bytes of the
-/// replies read into one buffer that nobody looks into. Throws std::runtime_error for whatever goes wrong.
+/// The floor of every question to the daemon: a socket, one request that was serialized beforehand, and the bytes of
+/// the replies read into one buffer that nobody looks into. Throws std::runtime_error for whatever goes wrong.
 class RawSession {
 public:
     explicit RawSession(std::string const &socketPath);

@@ -177,3 +177,34 @@ release_lock() {
     lock_holder=""
     rm -f "$BATS_TEST_TMPDIR/lock.go" "$BATS_TEST_TMPDIR/lock.held"
 }
+
+# stored_providers: the host's records, one line each, as name|url, then arrays as id/active/priority.
+stored_providers() {
+    sqlite3 "$TOVI_ROOT/host.db" "
+        SELECT p.name || '|' || p.url || coalesce((SELECT group_concat('|' || a.array_id || '/' || a.is_active || '/' || a.priority, '')
+            FROM (SELECT * FROM provider_array WHERE provider = p.id ORDER BY position) a), '')
+        FROM provider p ORDER BY p.id"
+}
+
+# mounted_host [lab/up options]: a host with its provider registered and its containers mounted. Leaves the first
+# container's $container (id), $container_name, $array (id of its first array) and $endpoint (uid of that one's first).
+mounted_host() {
+    host_up "$@"
+    register_provider
+    json_of storagecontainer load
+    expect_status 0
+    container="$(json_value 'd[0]["StorageContainer Id"]')"
+    container_name="$(json_value 'd[0]["StorageContainer Name"]')"
+    array="$(json_value 'd[0]["Arrays"][0]["ArrayId"]')"
+    endpoint="$(json_value 'd[0]["Arrays"][0]["PEInfo"][0].split("localUID: ")[1].split(",")[0]')"
+}
+
+# volume_uuid DIRECTORY: the uuid of the config volume of that directory name, as the array file has it.
+volume_uuid() {
+    sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT uuid FROM volume WHERE directory_name = '$1'"
+}
+
+# all_endpoints: the uids of the endpoints of every array, as the array file has them.
+all_endpoints() {
+    sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT uid FROM endpoint WHERE uid IS NOT NULL ORDER BY uid"
+}

@@ -41,7 +41,7 @@ expect_warning_once() {
     started=$EPOCHREALTIME
     lumo storagecontainer load
     [ "$(((${EPOCHREALTIME/./} - ${started/./}) / 1000))" -lt 2000 ]
-    expect_failure 3 "Unable to load Lumo datastores: " "$socket" "not running"
+    expect_failure 3 "Unable to load Lumo datastores: no daemon answers at $socket"
 }
 
 @test "each command that asks the daemon ends with status 3" {

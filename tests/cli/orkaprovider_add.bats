@@ -7,14 +7,6 @@ setup() {
     export TOVI_OFFLINE=1 # nothing here needs the daemon; no warning that it is away
 }
 
-# stored_providers: the host's records, one line each, as name|url, then arrays as id/active/priority.
-stored_providers() {
-    sqlite3 "$TOVI_ROOT/host.db" "
-        SELECT p.name || '|' || p.url || coalesce((SELECT group_concat('|' || a.array_id || '/' || a.is_active || '/' || a.priority, '')
-            FROM (SELECT * FROM provider_array WHERE provider = p.name ORDER BY position) a), '')
-        FROM provider p ORDER BY p.name"
-}
-
 @test "a provider without arrays is registered" {
     lumo orkaprovider add --vp-name lab --vp-url file:///lab.array
     expect_done $'Succesfully Added VP with name : lab\n'

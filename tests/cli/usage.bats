@@ -27,7 +27,7 @@ setup() {
 
 @test "a number that is none: parameter, value, what is expected" {
     lumo orkaprovider add --vp-name lab --vp-url u --arrayid a --priority many --isactive true
-    expect_failure 2 "priority" "many" "integer"
+    expect_failure 2 "priority" "many" "whole number"
 }
 
 @test "a number out of 64 bits is a usage error" {

@@ -1,0 +1,66 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// The floor of every command that changes the host: a bare program that opens a database file as the host store is
+// opened and commits as many durable transactions, one row each.
+//
+//   bench_transactions FILE COUNT STATEMENT
+//
+// STATEMENT is an INSERT whose ?1 is bound to "bench-<n>" and ?2 to a container id made of n.
+#include <cstdio>
+#include <cstdlib>
+#include <stdexcept>
+#include <string>
+
+#include <sqlite3.h>
+
+namespace {
+
+void check(sqlite3 *database, int code) {
+    if (code != SQLITE_OK && code != SQLITE_DONE && code != SQLITE_ROW) {
+        throw std::runtime_error(sqlite3_errmsg(database));
+    }
+}
+
+void execute(sqlite3 *database, char const *statements) {
+    check(database, sqlite3_exec(database, statements, nullptr, nullptr, nullptr));
+}
+
+void commitEach(sqlite3 *database, int count, char const *insert) {
+    sqlite3_stmt *statement = nullptr;
+    check(database, sqlite3_prepare_v2(database, insert, -1, &statement, nullptr));
+    for (int n = 0; n < count; ++n) {
+        std::string const name = "bench-" + std::to_string(n);
+        char id[37];
+        std::snprintf(id, sizeof(id), "be4c0000-0000-4000-8000-%012d", n);
+        execute(database, "BEGIN IMMEDIATE");
+        check(database, sqlite3_bind_text(statement, 1, name.c_str(), -1, SQLITE_TRANSIENT));
+        if (sqlite3_bind_parameter_count(statement) > 1) {
+            check(database, sqlite3_bind_text(statement, 2, id, -1, SQLITE_TRANSIENT));
+        }
+        check(database, sqlite3_step(statement));
+        check(database, sqlite3_reset(statement));
+        execute(database, "COMMIT");
+    }
+    sqlite3_finalize(statement);
+}
+
+} // namespace
+
+int main(int argc, char **argv) {
+    int const count = argc == 4 ? std::atoi(argv[2]) : 0;
+    if (count < 1) {
+        std::fputs("usage: bench_transactions FILE COUNT STATEMENT\n", stderr);
+        return 2;
+    }
+    sqlite3 *database = nullptr;
+    try {
+        check(database, sqlite3_open_v2(argv[1], &database, SQLITE_OPEN_READWRITE, nullptr));
+        execute(database, "PRAGMA journal_mode=DELETE; PRAGMA synchronous=EXTRA; PRAGMA foreign_keys=ON");
+        commitEach(database, count, argv[3]);
+        check(database, sqlite3_close(database));
+    } catch (std::exception const &error) {
+        std::fprintf(stderr, "bench_transactions: %s\n", error.what());
+        return 1;
+    }
+    return 0;
+}
