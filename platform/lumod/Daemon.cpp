@@ -21,7 +21,7 @@ Core::Core(Settings settingsGiven, Surroundings surroundings)
                outages.setStored(snapshot.endpointOutages);
                providers.apply(snapshot.providers);
            })
-    , services{timer, log, std::move(surroundings.newUuid), tasks, host, providers, faults, outages}
+    , services{timer, log, std::move(surroundings.newKey), tasks, host, providers, faults, outages}
     , surveyor(services)
     , volumes(services, surveyor)
     , unbindTimer(timer, tasks, settings.unbindPeriod,

@@ -46,7 +46,7 @@ Orka::CallContext ProviderCalls::contextFor(Operation operation) const {
         context.orkaContext = snapshot->orkaContext;
     }
     if (isChange(operation)) {
-        context.idempotencyKey = services_.newUuid();
+        context.idempotencyKey = services_.newKey();
     }
     return context;
 }

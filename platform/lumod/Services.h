@@ -21,8 +21,8 @@ namespace Lumod {
 struct Services {
     kj::Timer &timer;
     Log &log;
-    std::function<std::string()> newUuid; ///< for idempotency keys
-    kj::TaskSet &tasks;                   ///< what runs by itself; failures are logged
+    std::function<std::string()> newKey; ///< for idempotency keys
+    kj::TaskSet &tasks;                  ///< what runs by itself; failures are logged
     HostState &host;
     ProviderSet &providers;
     FaultRules &faults;

@@ -28,7 +28,7 @@ struct Surroundings {
     kj::Timer &timer; ///< monotonic; outlives the daemon
     Log &log;
     std::function<std::unique_ptr<Orka::Provider>(std::string const &url)> makeProvider;
-    std::function<std::string()> newUuid;
+    std::function<std::string()> newKey; ///< for changes on arrays: one that nobody has used before
 };
 
 struct Core;

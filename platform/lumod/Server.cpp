@@ -1,0 +1,151 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "lumod/Server.h"
+
+#include <cerrno>
+#include <cstring>
+#include <utility>
+#include <vector>
+
+#include <sys/socket.h>
+
+#include <fmt/format.h>
+#include <kj/async-unix.h>
+
+#include "Connection.h"
+#include "Shutdown.h"
+
+namespace Lumod {
+
+namespace {
+
+/// After this long the requests under way are told that they are given up, ...
+constexpr kj::Duration drainPatience = 4 * kj::SECONDS;
+/// ... and this much later nobody is waited for any more: within five seconds in all.
+constexpr kj::Duration lastPatience = 500 * kj::MILLISECONDS;
+/// How long to wait for descriptors or memory to become free.
+constexpr kj::Duration acceptPause = 100 * kj::MILLISECONDS;
+/// Connections to take before the others have their turn.
+constexpr int acceptsInARow = 64;
+
+} // namespace
+
+class Server::Implementation : public kj::TaskSet::ErrorHandler {
+public:
+    Implementation(Daemon &daemon, kj::AsyncIoContext &io, Admission admission)
+        : core_(daemon.core())
+        , io_(io)
+        , admission_(admission)
+        , connections_(*this)
+        , accepting_(std::make_unique<kj::TaskSet>(*this)) {}
+
+    void listen(Wire::UniqueFd socket, bool ordered) {
+        listeners_.push_back(std::make_unique<Listener>(io_.unixEventPort, std::move(socket), ordered));
+        accepting_->add(kj::evalLater([this, listener = listeners_.back().get()] { return accept(*listener); }));
+    }
+
+    kj::Promise<void> stop() {
+        accepting_ = nullptr;
+        listeners_.clear();
+        shutdown_.drain();
+        kj::Timer &timer = core_.timer;
+        auto givenUp = timer.afterDelay(drainPatience).then([this, &timer] {
+            shutdown_.giveUp();
+            return timer.afterDelay(lastPatience);
+        });
+        return connections_.onEmpty().exclusiveJoin(kj::mv(givenUp));
+    }
+
+    std::size_t connections() const {
+        return count_;
+    }
+
+private:
+    struct Listener {
+        Listener(kj::UnixEventPort &port, Wire::UniqueFd bound, bool isOrdered)
+            : socket(std::move(bound))
+            , observer(port, socket.get(), kj::UnixEventPort::FdObserver::OBSERVE_READ)
+            , ordered(isOrdered) {}
+
+        Wire::UniqueFd socket;
+        kj::UnixEventPort::FdObserver observer;
+        bool ordered;
+    };
+
+    kj::Promise<void> accept(Listener &listener) {
+        for (int accepted = 0; accepted < acceptsInARow; ++accepted) {
+            int const client = ::accept4(listener.socket.get(), nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
+            if (client >= 0) {
+                isShort_ = false;
+                admit(kj::AutoCloseFd(client), listener.ordered);
+            } else if (errno == EAGAIN || errno == EWOULDBLOCK) {
+                return listener.observer.whenBecomesReadable().then([this, &listener] { return accept(listener); });
+            } else if (errno != EINTR && errno != ECONNABORTED) {
+                logShortage(errno);
+                return core_.timer.afterDelay(acceptPause).then([this, &listener] { return accept(listener); });
+            }
+        }
+        return kj::evalLater([this, &listener] { return accept(listener); });
+    }
+
+    void logShortage(int error) {
+        if (!std::exchange(isShort_, true)) {
+            core_.log.write(LogLevel::Error, "-",
+                            fmt::format("Cannot take a connection: {}; trying again", std::strerror(error)));
+        }
+    }
+
+    void admit(kj::AutoCloseFd client, bool ordered) {
+        auto const peer = peerOf(client.get());
+        if (!peer || !admission_.admits(*peer)) {
+            core_.log.write(LogLevel::Warning, "-",
+                            peer ? fmt::format("Refused a connection of user {} (group {}, process {})", peer->uid,
+                                               peer->gid, peer->pid)
+                                 : std::string("Refused a connection of an unknown user"));
+            return;
+        }
+        using Flags = kj::LowLevelAsyncIoProvider;
+        auto stream =
+            io_.lowLevelProvider->wrapSocketFd(kj::mv(client), Flags::ALREADY_CLOEXEC | Flags::ALREADY_NONBLOCK);
+        auto connection = kj::heap<Connection>(core_, shutdown_, kj::mv(stream), ordered, ++lastNumber_);
+        ++count_;
+        auto served = kj::evalLater([connection = connection.get()] { return connection->run(); });
+        connections_.add(served.attach(kj::mv(connection), kj::defer([this] { --count_; })));
+    }
+
+    void taskFailed(kj::Exception &&exception) override {
+        // A peer that goes away in the middle is no event; its connection is simply over.
+        bool const isPeer = exception.getType() == kj::Exception::Type::DISCONNECTED;
+        core_.log.write(isPeer ? LogLevel::Verbose : LogLevel::Error, "-",
+                        fmt::format("A connection ended: {}", exception.getDescription().cStr()));
+    }
+
+    Core &core_;
+    kj::AsyncIoContext &io_;
+    Admission admission_;
+    Shutdown shutdown_;
+    uint64_t lastNumber_ = 0;
+    std::size_t count_ = 0;
+    bool isShort_ = false;
+    kj::TaskSet connections_;
+    std::vector<std::unique_ptr<Listener>> listeners_;
+    std::unique_ptr<kj::TaskSet> accepting_; ///< before the listeners that it waits for
+};
+
+Server::Server(Daemon &daemon, kj::AsyncIoContext &io, Admission admission)
+    : implementation_(std::make_unique<Implementation>(daemon, io, admission)) {}
+
+Server::~Server() = default;
+
+void Server::listen(Wire::UniqueFd socket, bool ordered) {
+    implementation_->listen(std::move(socket), ordered);
+}
+
+kj::Promise<void> Server::stop() {
+    return implementation_->stop();
+}
+
+std::size_t Server::connections() const {
+    return implementation_->connections();
+}
+
+} // namespace Lumod

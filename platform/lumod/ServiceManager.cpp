@@ -1,0 +1,117 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "lumod/ServiceManager.h"
+
+#include <array>
+#include <cstddef>
+#include <cstdlib>
+#include <cstring>
+#include <string_view>
+
+#include <fcntl.h>
+#include <sys/socket.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include <fmt/format.h>
+
+#include "wire/Failure.h"
+
+namespace Lumod {
+
+namespace {
+
+constexpr int firstPassed = 3;
+constexpr int passedMax = 16;
+
+/// The path that a listening stream socket is bound to; empty for anything else.
+std::string boundPath(int socket) {
+    int type = 0;
+    int listens = 0;
+    socklen_t size = sizeof type;
+    if (::getsockopt(socket, SOL_SOCKET, SO_TYPE, &type, &size) != 0 || type != SOCK_STREAM) {
+        return {};
+    }
+    size = sizeof listens;
+    if (::getsockopt(socket, SOL_SOCKET, SO_ACCEPTCONN, &listens, &size) != 0 || listens == 0) {
+        return {};
+    }
+    sockaddr_un address{};
+    size = sizeof address;
+    if (::getsockname(socket, reinterpret_cast<sockaddr *>(&address), &size) != 0 || address.sun_family != AF_UNIX ||
+        size <= offsetof(sockaddr_un, sun_path)) {
+        return {};
+    }
+    std::size_t const room = size - offsetof(sockaddr_un, sun_path);
+    return std::string(address.sun_path, ::strnlen(address.sun_path, room));
+}
+
+std::string_view lastPart(std::string_view path) {
+    std::size_t const slash = path.rfind('/');
+    return slash == std::string_view::npos ? path : path.substr(slash + 1);
+}
+
+int passedCount() {
+    char const *const pid = std::getenv("LISTEN_PID");
+    char const *const count = std::getenv("LISTEN_FDS");
+    if (pid == nullptr || count == nullptr || std::atol(pid) != static_cast<long>(::getpid())) {
+        return 0;
+    }
+    return std::atoi(count);
+}
+
+} // namespace
+
+PassedSockets takePassedSockets(Wire::Paths const &paths) {
+    int const count = passedCount();
+    ::unsetenv("LISTEN_PID");
+    ::unsetenv("LISTEN_FDS");
+    ::unsetenv("LISTEN_FDNAMES");
+    if (count < 0 || count > passedMax) {
+        throw Wire::Failure(Wire::ErrorCode::InvalidArgument, fmt::format("{} passed sockets are not two", count));
+    }
+    PassedSockets passed;
+    for (int descriptor = firstPassed; descriptor < firstPassed + count; ++descriptor) {
+        Wire::UniqueFd socket(descriptor);
+        ::fcntl(descriptor, F_SETFD, FD_CLOEXEC);
+        // By name, not by whole path: the service manager may have spelled the root in another way.
+        std::string const path = boundPath(descriptor);
+        std::string_view const name = lastPart(path);
+        if (!name.empty() && name == lastPart(paths.orderedSocket())) {
+            passed.ordered = std::move(socket);
+        } else if (!name.empty() && name == lastPart(paths.prioritySocket())) {
+            passed.priority = std::move(socket);
+        } else {
+            throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
+                                fmt::format("The passed descriptor {} is no listening socket of this daemon ({})",
+                                            descriptor, path.empty() ? "no path" : path));
+        }
+    }
+    for (Wire::UniqueFd const *socket : {&passed.ordered, &passed.priority}) {
+        if (*socket) {
+            ::fcntl(socket->get(), F_SETFL, ::fcntl(socket->get(), F_GETFL) | O_NONBLOCK);
+        }
+    }
+    return passed;
+}
+
+void notifyServiceManager(std::string const &state) {
+    char const *const path = std::getenv("NOTIFY_SOCKET");
+    sockaddr_un address{};
+    std::size_t const length = path == nullptr ? 0 : std::strlen(path);
+    if (length < 2 || length >= sizeof address.sun_path) {
+        return;
+    }
+    address.sun_family = AF_UNIX;
+    std::memcpy(address.sun_path, path, length);
+    if (path[0] == '@') {
+        address.sun_path[0] = '\0'; // a name of the abstract kind
+    }
+    Wire::UniqueFd const socket(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
+    if (socket) {
+        auto const size = static_cast<socklen_t>(offsetof(sockaddr_un, sun_path) + length);
+        ::sendto(socket.get(), state.data(), state.size(), MSG_NOSIGNAL, reinterpret_cast<sockaddr const *>(&address),
+                 size);
+    }
+}
+
+} // namespace Lumod
