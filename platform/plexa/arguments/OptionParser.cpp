@@ -88,45 +88,51 @@ void OptionParser::take(std::vector<std::string> const &words, std::size_t &posi
         failUnknown(option);
     }
     CallSpec::ParameterType const type = target->parameter->GetType();
-    std::string const name = target->parameter->GetName();
+    std::string const name = "--" + target->parameter->GetName();
     if (target->given && !isList(type)) {
-        throw UsageError("--" + name + " is given twice");
+        throw UsageError(name + " is given twice");
     }
-    ++position;
-    if (type == CallSpec::Flag) {
-        if (equals != std::string::npos) {
-            throw UsageError("--" + name + " takes no value, " + shownWord(word.substr(equals + 1)) + " was given");
-        }
-        target->given = true;
-        target->input->SetFlag(name);
-        return;
-    }
-    if (equals == std::string::npos && position == words.size()) {
-        throw UsageError("--" + name + " needs a value, " + expectation(type) + " is expected");
-    }
-    std::string const value = equals != std::string::npos ? word.substr(equals + 1) : words[position++];
     target->given = true;
-    switch (type) {
+    ++position;
+    if (equals != std::string::npos) {
+        std::string const value = word.substr(equals + 1);
+        if (type == CallSpec::Flag) {
+            throw UsageError(name + " takes no value, " + shownWord(value) + " was given");
+        }
+        target->store(name, value);
+    } else if (type == CallSpec::Flag) {
+        target->input->SetFlag(target->parameter->GetName());
+    } else if (position < words.size()) {
+        target->store(name, words[position]);
+        ++position;
+    } else {
+        throw UsageError(name + " needs a value, " + expectation(type) + " is expected");
+    }
+}
+
+void OptionParser::Target::store(std::string const &option, std::string const &value) {
+    std::string const name = parameter->GetName();
+    switch (parameter->GetType()) {
     case CallSpec::String:
-        target->input->SetString(name, value);
+        input->SetString(name, value);
         break;
     case CallSpec::Int:
-        target->input->SetInt(name, toNumber("--" + name, value));
+        input->SetInt(name, toNumber(option, value));
         break;
     case CallSpec::Bool:
-        target->input->SetBool(name, toTruth("--" + name, value));
+        input->SetBool(name, toTruth(option, value));
         break;
     case CallSpec::StringList:
-        target->texts.push_back(value);
+        texts.push_back(value);
         break;
     case CallSpec::IntList:
-        target->numbers.push_back(toNumber("--" + name, value));
+        numbers.push_back(toNumber(option, value));
         break;
     case CallSpec::BoolList:
-        target->truths.push_back(toTruth("--" + name, value));
+        truths.push_back(toTruth(option, value));
         break;
     case CallSpec::Flag:
-        break;
+        break; // takes no value
     }
 }
 

@@ -30,7 +30,8 @@ private:
 class JsonWriter {
 public:
     JsonWriter(FormatSettings const &settings, Sink &sink)
-        : chosen_(settings.chosenFields())
+        : outermost_(settings, [&settings](std::string const &) { return settings.chosenFields(); })
+        , nested_(settings, [](std::string const &) { return std::nullopt; })
         , stream_(sink)
         , writer_(stream_) {
         writer_.SetIndent(' ', 2);
@@ -52,8 +53,8 @@ private:
                 this->value(each, element, outermost);
             }
             writer_.EndArray();
-        } else if (dynamic_cast<MetaStruct const *>(value.get()) != nullptr) {
-            structure(value, schema, outermost);
+        } else if (auto const *made = dynamic_cast<MetaStruct const *>(value.get())) {
+            structure(*made, schema, outermost ? outermost_ : nested_);
         } else if (auto const *number = dynamic_cast<MetaInt const *>(value.get())) {
             writer_.Int64(number->GetValue());
         } else if (auto const *truth = dynamic_cast<MetaBool const *>(value.get())) {
@@ -63,15 +64,12 @@ private:
         }
     }
 
-    void structure(Object const &value, Object const &schema, bool outermost) {
-        std::vector<FieldView> fields = fieldsOf(value, schema);
-        if (outermost && chosen_) {
-            fields = selected(fields, *chosen_);
-        }
+    void structure(MetaStruct const &structure, Object const &schema, StructurePlans &plans) {
+        std::shared_ptr<StructurePlan const> const plan = plans.planOf(structure, schema);
         writer_.StartObject();
-        for (FieldView const &field : fields) {
+        for (FieldPlan const &field : *plan) {
             text(field.name);
-            this->value(field.value, field.schema, false);
+            value(structure.GetField(field.name), field.schema, false);
         }
         writer_.EndObject();
     }
@@ -81,7 +79,8 @@ private:
         writer_.RawValue(json.data(), json.size(), rapidjson::kStringType);
     }
 
-    std::optional<std::vector<std::string>> chosen_;
+    StructurePlans outermost_; // of these alone the user chooses fields
+    StructurePlans nested_;
     JsonStream stream_;
     rapidjson::PrettyWriter<JsonStream> writer_;
 };

@@ -2,6 +2,7 @@
 #include "ResultModel.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace Plexa {
 
@@ -25,6 +26,18 @@ Kind kindOfOne(Object const &object) {
         return Kind::Struct;
     }
     return as<MetaInt>(object) != nullptr ? Kind::Number : Kind::Scalar;
+}
+
+StructurePlan selected(StructurePlan const &fields, std::vector<std::string> const &names) {
+    StructurePlan chosen;
+    for (std::string const &name : names) {
+        auto const found =
+            std::find_if(fields.begin(), fields.end(), [&name](FieldPlan const &field) { return field.name == name; });
+        if (found != fields.end()) {
+            chosen.push_back(*found);
+        }
+    }
+    return chosen;
 }
 
 } // namespace
@@ -60,41 +73,35 @@ Object elementSchema(Object const &list, Object const &schema) {
     return element == nullptr && made != nullptr ? made->GetElementSchema() : element;
 }
 
-std::vector<FieldView> fieldsOf(Object const &value, Object const &schema) {
-    auto const *made = as<MetaStruct>(value);
+StructurePlans::StructurePlans(FormatSettings const &settings, Choice choice)
+    : settings_(settings)
+    , choice_(std::move(choice)) {}
+
+std::shared_ptr<StructurePlan const> StructurePlans::planOf(MetaStruct const &structure, Object const &schema) {
+    std::vector<std::string> names = structure.GetFieldNames();
+    Known &known = known_[schema.get()];
+    if (known.plan != nullptr && known.names == names) {
+        return known.plan;
+    }
+    StructurePlan fields;
     auto const *declared = as<MetaStruct>(schema);
-    std::vector<FieldView> fields;
+    std::string const name = declared != nullptr ? declared->GetName() : structure.GetName();
     if (declared != nullptr) {
-        for (std::string const &name : declared->GetFieldNames()) {
-            fields.push_back({name, made != nullptr ? made->GetField(name) : Object(), declared->GetField(name)});
+        for (std::string const &field : declared->GetFieldNames()) {
+            fields.push_back({field, declared->GetField(field), settings_.unit(name, field)});
         }
     }
-    if (made != nullptr) {
-        for (std::string const &name : made->GetFieldNames()) {
-            if (declared == nullptr || declared->GetField(name) == nullptr) {
-                fields.push_back({name, made->GetField(name), Object()});
-            }
+    for (std::string const &field : names) {
+        if (declared == nullptr || declared->GetField(field) == nullptr) {
+            fields.push_back({field, Object(), settings_.unit(name, field)});
         }
     }
-    return fields;
-}
-
-std::vector<FieldView> selected(std::vector<FieldView> const &fields, std::vector<std::string> const &names) {
-    std::vector<FieldView> chosen;
-    for (std::string const &name : names) {
-        auto const found =
-            std::find_if(fields.begin(), fields.end(), [&name](FieldView const &field) { return field.name == name; });
-        if (found != fields.end()) {
-            chosen.push_back(*found);
-        }
+    if (std::optional<std::vector<std::string>> const chosen = choice_(name)) {
+        fields = selected(fields, *chosen);
     }
-    return chosen;
-}
-
-std::string structureName(Object const &value, Object const &schema) {
-    auto const *made = as<MetaStruct>(value);
-    auto const *structure = made != nullptr ? made : as<MetaStruct>(schema);
-    return structure != nullptr ? structure->GetName() : std::string();
+    known.names = std::move(names);
+    known.plan = std::make_shared<StructurePlan const>(std::move(fields));
+    return known.plan;
 }
 
 } // namespace Plexa

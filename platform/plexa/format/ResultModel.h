@@ -1,11 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <functional>
+#include <map>
+#include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include <boost/shared_ptr.hpp>
 
+#include "plexa/FormatSettings.h"
 #include "plexa/MetaObj.h"
 
 namespace Plexa {
@@ -26,20 +31,38 @@ std::string scalarText(Object const &value);
 /// The schema of a list's elements: what the list was made with, else what the list's own schema declares.
 Object elementSchema(Object const &list, Object const &schema);
 
-/// A field of a structure with what it is declared as; either may be empty.
-struct FieldView {
+/// A field of a structure and what it is declared as; the schema may be empty.
+struct FieldPlan {
     std::string name;
-    Object value;
     Object schema;
+    std::string unit;
 };
 
-/// The fields of a structure: the declared ones in declared order, then what the value holds beyond them.
-std::vector<FieldView> fieldsOf(Object const &value, Object const &schema);
+/// The fields of a structure that are shown, in order: the declared ones in declared order, then what the value holds
+/// beyond them, unless a choice says otherwise. Names that are no field's are passed over.
+using StructurePlan = std::vector<FieldPlan>;
 
-/// The named ones of the fields, in the order of the names; names that are no field's are passed over.
-std::vector<FieldView> selected(std::vector<FieldView> const &fields, std::vector<std::string> const &names);
+/// Which fields are chosen of a structure; nothing for all of them.
+using Choice = std::function<std::optional<std::vector<std::string>>(std::string const &structure)>;
 
-/// The name of a structure, or of the schema in its place.
-std::string structureName(Object const &value, Object const &schema);
+/// Plans for the structures of a result. A long list has one plan, made at its first element.
+class StructurePlans {
+public:
+    /// @param settings for the units; must outlive this
+    StructurePlans(FormatSettings const &settings, Choice choice);
+
+    /// @param schema what the structure is declared as; may be empty
+    std::shared_ptr<StructurePlan const> planOf(MetaObj::MetaStruct const &structure, Object const &schema);
+
+private:
+    struct Known {
+        std::vector<std::string> names; ///< of the value that the plan was made for
+        std::shared_ptr<StructurePlan const> plan;
+    };
+
+    FormatSettings const &settings_;
+    Choice choice_;
+    std::map<MetaObj::MetaObject const *, Known> known_; // by schema
+};
 
 } // namespace Plexa

@@ -16,6 +16,7 @@ class SimpleWriter {
 public:
     SimpleWriter(FormatSettings const &settings, Sink &sink)
         : settings_(settings)
+        , plans_(settings, [&settings](std::string const &structure) { return settings.fields(structure); })
         , out_(sink) {}
 
     void value(Object const &value, Object const &schema, std::size_t indent) {
@@ -67,30 +68,28 @@ private:
             out_.print("{:{}}{}\n", "", indent, escaped(header));
             indent += step;
         }
-        std::vector<FieldView> fields = fieldsOf(object, schema);
-        if (auto const names = settings_.fields(made->GetName())) {
-            fields = selected(fields, *names);
-        }
-        for (FieldView const &each : fields) {
-            if (isSet(each.value)) {
-                field(each, made->GetName(), indent);
-            }
+        std::shared_ptr<StructurePlan const> const plan = plans_.planOf(*made, schema);
+        for (FieldPlan const &planned : *plan) {
+            field(planned, made->GetField(planned.name), indent);
         }
     }
 
-    void field(FieldView const &field, std::string const &structureName, std::size_t indent) {
-        Kind const kind = kindOf(field.value, field.schema);
+    void field(FieldPlan const &field, Object const &value, std::size_t indent) {
+        if (!isSet(value)) {
+            return;
+        }
+        Kind const kind = kindOf(value, field.schema);
         if (kind == Kind::Scalar || kind == Kind::Number) {
-            std::string const unit = settings_.unit(structureName, field.name);
-            out_.print("{:{}}{}: {}{}{}\n", "", indent, escaped(field.name), escaped(scalarText(field.value)),
-                       unit.empty() ? "" : " ", escaped(unit));
+            out_.print("{:{}}{}: {}{}{}\n", "", indent, escaped(field.name), escaped(scalarText(value)),
+                       field.unit.empty() ? "" : " ", escaped(field.unit));
         } else {
             out_.print("{:{}}{}:\n", "", indent, escaped(field.name));
-            value(field.value, field.schema, indent + step);
+            this->value(value, field.schema, indent + step);
         }
     }
 
     FormatSettings const &settings_;
+    StructurePlans plans_;
     TextBuffer out_;
 };
 

@@ -19,7 +19,7 @@ constexpr std::size_t gap = 2;
 using Cell = std::vector<std::string>;
 
 struct Column {
-    FieldView field; ///< its name and schema; no value
+    FieldPlan field;
     std::string title;
     std::size_t width = 0;
     bool isNumber = false;
@@ -54,24 +54,23 @@ private:
 
     /// What is no table: a value, or a list of values one below the other.
     void writeRest(Result const &result) {
-        for (std::string const &line : cell({std::string(), result.value, result.schema}, std::string())) {
+        for (std::string const &line : cell(result.value, std::string())) {
             out_.print("{}\n", line);
         }
     }
 
-    void table(std::vector<Object> const &rows, Object const &schema, Names names, std::size_t indent) {
+    void table(std::vector<Object> const &rows, Object const &schema, Names const &names, std::size_t indent) {
         Object const declared = schema != nullptr || rows.empty() ? schema : rows.front();
-        std::string const name = structureName(Object(), declared);
-        if (!names) {
-            names = settings_.fields(name);
+        auto const structure = boost::dynamic_pointer_cast<MetaStruct>(declared);
+        if (structure == nullptr) {
+            return; // an empty list of nobody knows what
         }
-        std::vector<FieldView> fields = fieldsOf(Object(), declared);
-        if (names) {
-            fields = selected(fields, *names);
-        }
+        StructurePlans plans(settings_,
+                             [&](std::string const &name) { return names ? names : settings_.fields(name); });
+        std::shared_ptr<StructurePlan const> const plan = plans.planOf(*structure, declared);
         std::vector<Column> columns;
-        std::vector<FieldView> nested;
-        for (FieldView const &field : fields) {
+        StructurePlan nested;
+        for (FieldPlan const &field : *plan) {
             if (kindOf(Object(), field.schema) == Kind::StructList) {
                 nested.push_back(field);
             } else {
@@ -84,24 +83,23 @@ private:
         std::vector<std::vector<Cell>> cells;
         cells.reserve(rows.size());
         for (Object const &row : rows) {
-            cells.push_back(cellsOf(row, columns, name));
+            cells.push_back(cellsOf(row, columns));
         }
         heading(columns, indent);
         for (std::size_t i = 0; i < rows.size(); ++i) {
             printRow(cells[i], columns, indent);
-            for (FieldView const &field : nested) {
+            for (FieldPlan const &field : nested) {
                 nestedTable(rows[i], field, indent + step);
             }
         }
     }
 
-    std::vector<Cell> cellsOf(Object const &row, std::vector<Column> &columns, std::string const &structure) {
+    static std::vector<Cell> cellsOf(Object const &row, std::vector<Column> &columns) {
         auto const made = boost::dynamic_pointer_cast<MetaStruct>(row);
         std::vector<Cell> cells;
+        cells.reserve(columns.size());
         for (Column &column : columns) {
-            Object const value = made != nullptr ? made->GetField(column.field.name) : Object();
-            cells.push_back(
-                cell({column.field.name, value, column.field.schema}, settings_.unit(structure, column.field.name)));
+            cells.push_back(cell(made != nullptr ? made->GetField(column.field.name) : Object(), column.field.unit));
             for (std::string const &line : cells.back()) {
                 column.width = std::max(column.width, displayWidth(line));
             }
@@ -109,14 +107,14 @@ private:
         return cells;
     }
 
-    static Cell cell(FieldView const &field, std::string const &unit) {
+    static Cell cell(Object const &value, std::string const &unit) {
         Cell lines;
-        if (auto const list = boost::dynamic_pointer_cast<MetaList>(field.value)) {
+        if (auto const list = boost::dynamic_pointer_cast<MetaList>(value)) {
             for (Object const &element : list->GetElements()) {
                 lines.push_back(escaped(scalarText(element)));
             }
-        } else if (isSet(field.value)) {
-            lines.push_back(escaped(scalarText(field.value)) + (unit.empty() ? "" : " " + escaped(unit)));
+        } else if (isSet(value)) {
+            lines.push_back(escaped(scalarText(value)) + (unit.empty() ? "" : " " + escaped(unit)));
         }
         return lines;
     }
@@ -155,7 +153,7 @@ private:
         }
     }
 
-    void nestedTable(Object const &row, FieldView const &field, std::size_t indent) {
+    void nestedTable(Object const &row, FieldPlan const &field, std::size_t indent) {
         auto const made = boost::dynamic_pointer_cast<MetaStruct>(row);
         Object const value = made != nullptr ? made->GetField(field.name) : Object();
         auto const nested = boost::dynamic_pointer_cast<MetaList>(value);

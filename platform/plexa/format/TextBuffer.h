@@ -22,7 +22,7 @@ public:
 
     template <typename... Values>
     void print(fmt::format_string<Values...> pattern, Values &&...values) {
-        fmt::format_to(std::back_inserter(buffer_), pattern, std::forward<Values>(values)...);
+        fmt::format_to(fmt::appender(buffer_), pattern, std::forward<Values>(values)...);
         if (buffer_.size() >= enough) {
             flush();
         }

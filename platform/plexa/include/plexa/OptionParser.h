@@ -47,6 +47,8 @@ public:
 private:
     /// A declared parameter, where its values go, and those of a list so far.
     struct Target {
+        void store(std::string const &option, std::string const &value);
+
         boost::shared_ptr<CallSpec::ParameterSpec> parameter;
         boost::shared_ptr<CallSpec::Input> input;
         bool given = false;
