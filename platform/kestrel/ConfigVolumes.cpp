@@ -70,18 +70,17 @@ Store::Volume ConfigVolumes::requireMounted(LumoClient::VolumeKey const &key) {
 
 void ConfigVolumes::mount(std::string const &name, std::string const &uuid) {
     LumoClient::Volume const bound = host_.client.bindVirtualVolume(keyOf(name, uuid), channel_);
-    bool mountedBefore = false;
     try {
-        place(bound, mountedBefore);
+        place(bound);
     } catch (Wire::Failure const &) {
-        if (!mountedBefore) {
+        if (!mayBeMounted(bound.uuid)) {
             unbindQuietly(bound.uuid);
         }
         throw;
     }
 }
 
-void ConfigVolumes::place(LumoClient::Volume const &bound, bool &mountedBefore) {
+void ConfigVolumes::place(LumoClient::Volume const &bound) {
     // What a provider calls its volumes becomes part of a path here.
     requireDirectoryName(bound.uuid, "volume uuid");
     requireDirectoryName(bound.directoryName, "directory name");
@@ -89,7 +88,6 @@ void ConfigVolumes::place(LumoClient::Volume const &bound, bool &mountedBefore) 
     Store::HostStore::Change change(host_.store);
     auto const &settled = directories.finishUnsettled();
     if (auto const record = host_.store.volume(bound.uuid); record && isMounted(*record)) {
-        mountedBefore = true;
         throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
                             "the config volume '" + record->directoryName + "' (" + record->uuid +
                                 ") is mounted already in the storage container '" + containerName_ + '\'');
@@ -138,8 +136,8 @@ void ConfigVolumes::unmount(std::string const &name, std::string const &uuid) {
             host_.store.putVolumes({inState(volume, Store::VolumeState::Mounted)}, {});
             throw;
         }
-    } catch (Wire::Failure const &failure) {
-        if (failure.code() != Wire::ErrorCode::NoSuchVolume) {
+    } catch (Wire::Failure const &) {
+        if (mayBeMounted(volume.uuid)) {
             bindQuietly(volume.uuid); // it stays mounted
         }
         throw;
@@ -206,6 +204,15 @@ void ConfigVolumes::forget(Store::Volume const &volume) {
                             "the config volume is deleted on its array, but what it held on this host is "
                             "not: " +
                                 failure.sentence());
+    }
+}
+
+bool ConfigVolumes::mayBeMounted(std::string const &uuid) {
+    try {
+        auto const record = host_.store.volume(uuid);
+        return record && isMounted(*record);
+    } catch (Wire::Failure const &) {
+        return true;
     }
 }
 

@@ -28,9 +28,10 @@ private:
     /// What this host still has of a volume: the mounted one, or by name every one that was put away under it.
     std::vector<Store::Volume> recordsOf(LumoClient::VolumeKey const &key, std::vector<Store::Volume> const &settled);
     Store::Volume requireMounted(LumoClient::VolumeKey const &key);
-    /// @param mountedBefore set when the volume turns out to be mounted already
-    void place(LumoClient::Volume const &bound, bool &mountedBefore);
+    void place(LumoClient::Volume const &bound);
     void forget(Store::Volume const &volume);
+    /// After a failure: a commit that failed may have taken effect, and a store that cannot be read tells nothing.
+    bool mayBeMounted(std::string const &uuid);
     void bindQuietly(std::string const &uuid);
     void unbindQuietly(std::string const &uuid);
 

@@ -89,19 +89,22 @@ void Database::open(Options const &options) {
 
 void Database::checkIdentity() {
     auto const name = [this] { return named(identity_.kindName, path_); };
+    Header header = readHeader(handle_->getHandle());
+    bool const maybeOurs = header.kind == Header::Kind::Zeros ||
+                           (header.kind == Header::Kind::Database && header.applicationId == identity_.applicationId);
+    // Asked after the header was read: a journal that is gone by now had committed what the header says.
     char const *const journal = sqlite3_filename_journal(sqlite3_db_filename(handle_->getHandle(), "main"));
-    Header header = readHeader(handle_->getHandle(), exists(journal));
-    if (header.kind == Header::Kind::Unfinished) {
-        // Any read rolls the first transaction back.
+    if (maybeOurs && exists(journal)) {
+        // Any read rolls back what a killed process left, which may be all there is: its first transaction.
         Query(*this, "SELECT count(*) FROM sqlite_schema").step();
-        header = readHeader(handle_->getHandle(), false);
+        header = readHeader(handle_->getHandle());
     }
     if (header.kind == Header::Kind::Empty) {
         if (mode_ != Mode::Create) {
             throw Error(ErrorKind::Missing, name() + " has no content yet");
         }
         createLayout();
-        header = readHeader(handle_->getHandle(), false);
+        header = readHeader(handle_->getHandle());
     }
     if (header.kind != Header::Kind::Database) {
         throw Error(ErrorKind::Malformed, name() + " is damaged: it does not begin as a database file does");

@@ -28,7 +28,7 @@ int32_t bigEndian(Bytes const &bytes, std::size_t offset) {
 
 } // namespace
 
-Header readHeader(sqlite3 *handle, bool journalExists) {
+Header readHeader(sqlite3 *handle) {
     Header header;
     sqlite3_file *file = nullptr;
     if (sqlite3_file_control(handle, "main", SQLITE_FCNTL_FILE_POINTER, &file) != SQLITE_OK || file == nullptr ||
@@ -53,8 +53,8 @@ Header readHeader(sqlite3 *handle, bool journalExists) {
         header.kind = Header::Kind::Database;
         header.applicationId = bigEndian(bytes, applicationIdOffset);
         header.userVersion = bigEndian(bytes, userVersionOffset);
-    } else if (journalExists && std::all_of(bytes.begin(), bytes.end(), [](unsigned char byte) { return byte == 0; })) {
-        header.kind = Header::Kind::Unfinished;
+    } else if (std::all_of(bytes.begin(), bytes.end(), [](unsigned char byte) { return byte == 0; })) {
+        header.kind = Header::Kind::Zeros;
     }
     return header;
 }

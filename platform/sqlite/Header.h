@@ -12,9 +12,8 @@ struct Header {
     enum class Kind {
         Empty,    ///< no bytes at all
         Database, ///< the other fields count
-        /// Zeros where the header belongs, beside a journal: the file was cut off in its very first transaction.
-        Unfinished,
-        Garbage, ///< no database
+        Zeros,    ///< nothing but zeros where the header belongs: cut off in its very first transaction, or no database
+        Garbage,  ///< no database
     };
     Kind kind = Kind::Garbage;
     int32_t applicationId = 0;
@@ -23,8 +22,7 @@ struct Header {
 
 /// Reads through the connection's own descriptor: opening the file a second time and closing it would drop every lock
 /// that this process holds on it.
-/// @param journalExists whether the rollback journal stands beside the file
 /// @return Garbage also when the file cannot be read
-Header readHeader(sqlite3 *handle, bool journalExists);
+Header readHeader(sqlite3 *handle);
 
 } // namespace Sqlite
