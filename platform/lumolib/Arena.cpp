@@ -2,7 +2,6 @@
 #include "Arena.h"
 
 #include <algorithm>
-#include <cstdint>
 #include <cstring>
 
 namespace LumoClient {
@@ -24,21 +23,14 @@ Arena::~Arena() {
     }
 }
 
-void *Arena::allocate(std::size_t bytes, std::size_t alignment) {
-    std::size_t const gap = (alignment - reinterpret_cast<std::uintptr_t>(next_) % alignment) % alignment;
-    if (next_ == nullptr || gap > left_ || bytes > left_ - gap) {
-        std::size_t const size =
-            std::max(sizeof(Block) + bytes + alignment, std::clamp(total_ / growth, leastBlock, largestBlock));
-        newest_ = new (::operator new(size)) Block{newest_};
-        next_ = reinterpret_cast<std::byte *>(newest_) + sizeof(Block);
-        left_ = size - sizeof(Block);
-        total_ += size;
-        return allocate(bytes, alignment);
-    }
-    std::byte *result = next_ + gap;
-    next_ = result + bytes;
-    left_ -= gap + bytes;
-    return result;
+void *Arena::allocateInNewBlock(std::size_t bytes, std::size_t alignment) {
+    std::size_t const size =
+        std::max(sizeof(Block) + bytes + alignment, std::clamp(total_ / growth, leastBlock, largestBlock));
+    newest_ = new (::operator new(size)) Block{newest_};
+    next_ = reinterpret_cast<std::byte *>(newest_) + sizeof(Block);
+    left_ = size - sizeof(Block);
+    total_ += size;
+    return allocate(bytes, alignment);
 }
 
 char const *Arena::copy(capnp::Text::Reader text) {

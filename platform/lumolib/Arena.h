@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <new>
 #include <type_traits>
 
@@ -19,7 +20,16 @@ public:
     Arena &operator=(Arena const &) = delete;
 
     /// @throw std::bad_alloc
-    void *allocate(std::size_t bytes, std::size_t alignment);
+    void *allocate(std::size_t bytes, std::size_t alignment) {
+        std::size_t const gap = (alignment - reinterpret_cast<std::uintptr_t>(next_) % alignment) % alignment;
+        if (next_ == nullptr || gap > left_ || bytes > left_ - gap) {
+            return allocateInNewBlock(bytes, alignment);
+        }
+        std::byte *result = next_ + gap;
+        next_ = result + bytes;
+        left_ -= gap + bytes;
+        return result;
+    }
 
     /// Records, all zero. They have nothing to destroy.
     template <typename Record>
@@ -32,6 +42,8 @@ public:
     char const *copy(capnp::Text::Reader text);
 
 private:
+    void *allocateInNewBlock(std::size_t bytes, std::size_t alignment);
+
     struct Block {
         Block *previous;
     };

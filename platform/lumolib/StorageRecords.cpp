@@ -55,7 +55,6 @@ void StorageRecords::takeContainers(capnp::List<Wire::StorageContainer>::Reader 
 
 void StorageRecords::fillArray(StorageArrayInfo &record, Wire::StorageArray::Reader array) {
     capnp::List<Wire::Endpoint>::Reader const endpoints = array.getEndpoints();
-    connection_.requireChunk(endpoints.size());
     record.arrayId = arena_.copy(array.getId());
     record.name = arena_.copy(array.getName());
     record.vendorId = arena_.copy(array.getVendorId());
@@ -71,7 +70,6 @@ void StorageRecords::fillArray(StorageArrayInfo &record, Wire::StorageArray::Rea
 
 void StorageRecords::fillEndpoint(ProtocolEndpointInfo &record, Wire::Endpoint::Reader endpoint) {
     capnp::List<capnp::Text>::Reader const addresses = endpoint.getAddresses();
-    connection_.requireChunk(addresses.size());
     record.localUID = endpoint.hasUid() ? arena_.copy(endpoint.getUid()) : nullptr;
     record.nfs4xAddressCount = static_cast<std::int32_t>(addresses.size());
     record.nfs4xAddresses = arena_.records<char const *>(addresses.size());

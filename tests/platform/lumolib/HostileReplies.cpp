@@ -137,6 +137,22 @@ TEST_F(HostileReplies, fault_24_a_list_longer_than_a_chunk) {
               "broke the protocol: it sent a list of 1001 elements in one message");
 }
 
+TEST_F(HostileReplies, fault_24_an_answer_without_an_end) {
+    FakeDaemon daemon(socket(), [](Wire::Request::Reader request, Peer &peer) {
+        for (;;) {
+            peer.reply(
+                request.getId(), [](Wire::Reply::Builder reply) { reply.initConfigLumos(1)[0].initUuid(15 << 20); },
+                false);
+        }
+    });
+    ASSERT_TRUE(LumoLib_Init(0, 0));
+    LumoQueryResult *result = nullptr;
+    EXPECT_EQ(LumoLib_QueryAllConfigLumos(containerId, 0, 0, &result, 0), code(ErrorCode::ProtocolError));
+    EXPECT_EQ(lastFailure(),
+              "5: the daemon at " + socket() + " broke the protocol: its answer is larger than 268435456 bytes");
+    EXPECT_EQ(result, nullptr);
+}
+
 TEST_F(HostileReplies, fault_24_a_negative_size) {
     EXPECT_EQ(query([](Wire::Request::Reader request, Peer &peer) {
                   peer.reply(request.getId(), [](Wire::Reply::Builder reply) {

@@ -15,7 +15,7 @@ inline constexpr std::size_t requestBytesMax = std::size_t{1} << 20;
 /// Bytes of a reply message's body.
 inline constexpr std::size_t replyBytesMax = std::size_t{16} << 20;
 /// Bytes of all reply messages that answer one request; a client gives up on a daemon that sends more.
-inline constexpr std::uint64_t answerBytesMax = std::uint64_t{1} << 30;
+inline constexpr std::uint64_t answerBytesMax = std::uint64_t{256} << 20;
 /// Segments of one message. A builder that grows its segments stays far below.
 inline constexpr std::uint32_t segmentCountMax = 64;
 /// Structures within structures.
