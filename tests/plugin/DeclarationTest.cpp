@@ -65,7 +65,7 @@ TEST_P(CommandClass, DeclaresItsResult) {
     EXPECT_EQ(Doubles::describe(command->GetOutputSpec()->GetOutputType()), GetParam().result);
 }
 
-TEST_P(CommandClass, MakesAFreshSpecificationEachTime) {
+TEST_P(CommandClass, MakesFreshInputAndOutputSpecsEachTime) {
     auto const command = GetParam().make();
     EXPECT_NE(command->GetInputSpecInternal(), command->GetInputSpecInternal());
     EXPECT_NE(command->GetOutputSpecInternal()->GetOutputType(), command->GetOutputSpecInternal()->GetOutputType());

@@ -37,10 +37,10 @@ struct Parameter {
     char const *description;
 };
 
-/// @return a specification of the parameters, in the order given.
+/// @return an InputSpec of the parameters, in the order given.
 InputSpecPtr declareParameters(std::initializer_list<Parameter> parameters);
 
-/// @return a specification of a result that looks like the schema.
+/// @return an OutputSpec for a result that looks like the schema.
 OutputSpecPtr declareResult(boost::shared_ptr<Plexa::MetaObj::MetaObject> const &schema);
 
 /// @return an empty list of structures that look like the schema.
