@@ -57,7 +57,7 @@ TEST(PluginLibrary, NamesNoPlaceToLookForLibraries) {
 TEST(PluginLibrary, ShowsItsEntryPointAndTheCommandClassesAlone) {
     // What templates and inline functions of other headers leave is weak, and everybody's.
     std::regex const strong("[0-9a-f]+ ([TDBRU]) (.*)");
-    std::regex const member("(?:.* for |.* to )?TarselCli::LumoNamespace::([A-Za-z]+)(?:::.*)?");
+    std::regex const member("(?:.* for |.* to |.*-in-)?TarselCli::LumoNamespace::([A-Za-z]+)(?:::.*)?");
     std::set<std::string> classes;
     std::vector<std::string> others;
     for (std::string const &line : linesOf("nm -DC --defined-only " PLUGIN_LIBRARY)) {
