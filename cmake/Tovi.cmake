@@ -17,6 +17,8 @@ set(CMAKE_EXPORT_COMPILE_COMMANDS ON)
 set(CMAKE_RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/bin)
 set(CMAKE_LIBRARY_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/lib)
 set(CMAKE_ARCHIVE_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/archive)
+# Programs find the libraries beside them, wherever the tree is moved to.
+set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
 set(TOVI_PLUGIN_DIRECTORY ${CMAKE_BINARY_DIR}/lib/tovicli/plugins)
 
 add_link_options(-Wl,--as-needed -Wl,-O1)
