@@ -16,6 +16,11 @@ LumoClient::Channel channelFor(bool priority) {
     return priority ? LumoClient::Channel::Priority : LumoClient::Channel::Ordered;
 }
 
+bool isAway(Wire::ErrorCode code) {
+    return code == Wire::ErrorCode::DaemonNotRunning || code == Wire::ErrorCode::ConnectionLost ||
+           code == Wire::ErrorCode::DeadlineExceeded || code == Wire::ErrorCode::ShuttingDown;
+}
+
 } // namespace
 
 LumoFileSystem::LumoFileSystem(std::shared_ptr<Host> host, std::string_view name, std::string_view containerId)
@@ -91,8 +96,17 @@ LumoFileSystem::CheckLumoAccessibility(std::vector<std::string> const &lumoIds) 
             return accessibility;
         }
         accessibility.reserve(lumoIds.size());
-        for (std::uint8_t const value : host_->client.checkLumoAccessibility(std::string(containerId()), lumoIds)) {
-            accessibility.push_back(static_cast<Gantry::Storage::LumoAccessibilityType>(value));
+        try {
+            for (std::uint8_t const value : host_->client.checkLumoAccessibility(std::string(containerId()), lumoIds)) {
+                accessibility.push_back(static_cast<Gantry::Storage::LumoAccessibilityType>(value));
+            }
+        } catch (Wire::Failure const &failure) {
+            if (!isAway(failure.code())) {
+                throw;
+            }
+            // Without a daemon nobody can confirm any of them; that is an answer, and the tool tells the cause.
+            LumoPlatform_NoteFailure(static_cast<int32_t>(failure.code()), failure.sentence().c_str());
+            accessibility.assign(lumoIds.size(), Gantry::Storage::Unconfirmed);
         }
         return accessibility;
     });
