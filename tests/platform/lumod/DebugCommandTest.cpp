@@ -84,8 +84,8 @@ TEST_F(DebugCommandTest, TheDumpHoldsEveryObjectWhateverTheLevel) {
         rule.setFrequency(9);
     });
     logLevel(1);
-    EXPECT_THAT(dump(), testing::ElementsAre("daemon", "provider", "provider", "providerArray", "activation", "faultRule",
-                                             "endpointOutage", "waitingUnbind"));
+    EXPECT_THAT(dump(), testing::ElementsAre("daemon", "provider", "provider", "providerArray", "activation",
+                                             "faultRule", "endpointOutage", "waitingUnbind"));
     EXPECT_THAT(last_["waitingUnbind"], HasSubstr(uuid));
     EXPECT_THAT(last_["faultRule"], HasSubstr(R"("fault":"TIMEOUT","operation":"*","frequency":9)"));
     EXPECT_THAT(last_["daemon"], HasSubstr(R"("logLevel":"quiet")"));

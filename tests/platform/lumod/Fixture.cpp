@@ -59,8 +59,7 @@ DaemonFixture::DaemonFixture() {
         return std::make_unique<FakeProvider>(vendor->second);
     };
     daemon_ = std::make_unique<Lumod::Daemon>(
-        settings,
-        Lumod::Surroundings{timer_, log_, makeProvider, [this] { return fmt::format("key-{}", ++keys_); }});
+        settings, Lumod::Surroundings{timer_, log_, makeProvider, [this] { return fmt::format("key-{}", ++keys_); }});
 }
 
 DaemonFixture::~DaemonFixture() noexcept = default;
@@ -85,8 +84,7 @@ Pending DaemonFixture::start(Fill const &fill, bool ordered, std::string const &
     auto root = request->initRoot<Wire::Request>();
     root.setVersion(Wire::PROTOCOL_VERSION);
     fill(root);
-    auto const call =
-        std::make_shared<Lumod::Call const>(Lumod::Call{trace, timer_.now() + 30 * kj::SECONDS, ordered});
+    auto const call = std::make_shared<Lumod::Call const>(Lumod::Call{trace, timer_.now() + 30 * kj::SECONDS, ordered});
     auto promise = Lumod::dispatch(daemon_->core(), call, root.asReader());
     return {std::move(request), kj::mv(promise)};
 }

@@ -28,16 +28,16 @@ TEST(Log, WritesWhatItsLevelShows) {
         LogLevel level;
         char const *shown;
     };
-    Case const cases[] = {{LogLevel::Quiet, ""},     {LogLevel::Panic, "P"},       {LogLevel::Error, "PE"},
-                          {LogLevel::Warning, "PEW"}, {LogLevel::Info, "PEWI"},    {LogLevel::Verbose, "PEWIV"},
+    Case const cases[] = {{LogLevel::Quiet, ""},       {LogLevel::Panic, "P"},   {LogLevel::Error, "PE"},
+                          {LogLevel::Warning, "PEW"},  {LogLevel::Info, "PEWI"}, {LogLevel::Verbose, "PEWIV"},
                           {LogLevel::Trivia, "PEWIVT"}};
     for (Case const &each : cases) {
         MemorySink sink;
         Lumod::Log log(sink, each.level);
         std::string shown;
-        for (auto const &[level, letter] : {std::pair{LogLevel::Panic, 'P'}, std::pair{LogLevel::Error, 'E'},
-                                            std::pair{LogLevel::Warning, 'W'}, std::pair{LogLevel::Info, 'I'},
-                                            std::pair{LogLevel::Verbose, 'V'}, std::pair{LogLevel::Trivia, 'T'}}) {
+        for (auto const &[level, letter] :
+             {std::pair{LogLevel::Panic, 'P'}, std::pair{LogLevel::Error, 'E'}, std::pair{LogLevel::Warning, 'W'},
+              std::pair{LogLevel::Info, 'I'}, std::pair{LogLevel::Verbose, 'V'}, std::pair{LogLevel::Trivia, 'T'}}) {
             sink.text.clear();
             log.write(level, "t", "x");
             if (!sink.text.empty()) {
@@ -69,7 +69,8 @@ TEST(Log, HostileTextsStayOnTheirLine) {
     MemorySink sink;
     Lumod::Log log(sink, LogLevel::Info, [] { return at(0); });
     log.write(LogLevel::Info, "a\nb", "x\r\n\x1b[31m\xff\xe2\x80\xae y\\z \xc3\xa4");
-    EXPECT_EQ(sink.text, "1970-01-01T00:00:00.000Z info a\\x0Ab x\\x0D\\x0A\\x1B[31m\\xFF\\xE2\\x80\\xAE y\\\\z \xc3\xa4\n");
+    EXPECT_EQ(sink.text,
+              "1970-01-01T00:00:00.000Z info a\\x0Ab x\\x0D\\x0A\\x1B[31m\\xFF\\xE2\\x80\\xAE y\\\\z \xc3\xa4\n");
 }
 
 TEST(Log, ALongTraceIsCut) {
@@ -83,13 +84,17 @@ TEST(Escape, TellsUtf8FromOtherBytes) {
     for (char const *good : {"", "plain", "\xc3\xa4", "\xe2\x82\xac", "\xf0\x9f\x98\x80", "\xf4\x8f\xbf\xbf"}) {
         EXPECT_TRUE(Lumod::isUtf8(good)) << good;
     }
-    for (char const *bad : {"\x80", "\xc3", "\xc0\xaf", "\xed\xa0\x80", "\xf4\x90\x80\x80", "\xe0\x80\xaf", "\xff", "a\xe2\x82"}) {
+    for (char const *bad :
+         {"\x80", "\xc3", "\xc0\xaf", "\xed\xa0\x80", "\xf4\x90\x80\x80", "\xe0\x80\xaf", "\xff", "a\xe2\x82"}) {
         EXPECT_FALSE(Lumod::isUtf8(bad)) << bad;
     }
 }
 
 TEST(Escape, RepairsWhatIsNoUtf8) {
-    EXPECT_EQ(Lumod::repaired("a\xff" "b\xc3\xa4"), "a\xef\xbf\xbd" "b\xc3\xa4");
+    EXPECT_EQ(Lumod::repaired("a\xff"
+                              "b\xc3\xa4"),
+              "a\xef\xbf\xbd"
+              "b\xc3\xa4");
 }
 
 } // namespace

@@ -79,9 +79,8 @@ TEST_F(MutationQueueTest, OneThatIsDroppedInItsTurnEndsIt) {
 }
 
 TEST_F(MutationQueueTest, AFailureEndsTheTurn) {
-    auto failed = queue_.inTurn([]() -> Answer<Done> {
-        return Outcome<Done>(Wire::Failure(Wire::ErrorCode::InUse, "no"));
-    });
+    auto failed =
+        queue_.inTurn([]() -> Answer<Done> { return Outcome<Done>(Wire::Failure(Wire::ErrorCode::InUse, "no")); });
     EXPECT_FALSE(failed.wait(scope_).ok());
     Task a = enqueue('a');
     scope_.poll();

@@ -169,8 +169,8 @@ TEST_F(ProviderStateTest, InjectionRefusesWhatItDoesNotKnow) {
 
 TEST_F(ProviderStateTest, AProviderThatIsUnreachableGivesWayToTheNext) {
     addTwins(9, 1);
-    vendors_.at("fake:one")->failing.emplace("queryStorageArray",
-                                             Wire::Failure(ErrorCode::ProviderUnreachable, "the wire is cut"));
+    vendors_.at("fake:one")
+        ->failing.emplace("queryStorageArray", Wire::Failure(ErrorCode::ProviderUnreachable, "the wire is cut"));
     EXPECT_THAT(containers(), ElementsAre("gold@fake:two[a1]"));
 }
 

@@ -169,9 +169,8 @@ TEST_F(StorageContainersTest, FindTellsWhatIsNotThere) {
     addUsualVendor();
     EXPECT_EQ(find(2).code(), ErrorCode::NoSuchContainer);
     EXPECT_EQ(find(1, {"a1", "a9"}).code(), ErrorCode::NoSuchArray);
-    Reply const bad = ask([](Wire::Request::Builder request) {
-        request.initFindStorageContainer().setContainerId("no id");
-    });
+    Reply const bad =
+        ask([](Wire::Request::Builder request) { request.initFindStorageContainer().setContainerId("no id"); });
     EXPECT_EQ(bad.code(), ErrorCode::InvalidArgument);
 }
 

@@ -64,13 +64,14 @@ TEST_F(VolumesTest, EveryChangeCarriesAKeyOfItsOwnAndQueriesCarryNone) {
 }
 
 TEST_F(VolumesTest, fault_53_ADirectoryNameIsOnePathComponent) {
-    for (std::string const &bad : {std::string("."), std::string(".."), std::string("a/b"), std::string("/"),
-                                   std::string("a\nb"), std::string("a\0b", 3), std::string("\x7f"),
-                                   std::string("\xff"), std::string(256, 'n'), std::string()}) {
+    for (std::string const &bad :
+         {std::string("."), std::string(".."), std::string("a/b"), std::string("/"), std::string("a\nb"),
+          std::string("a\0b", 3), std::string("\x7f"), std::string("\xff"), std::string(256, 'n'), std::string()}) {
         EXPECT_EQ(create(bad).code(), ErrorCode::InvalidArgument) << testing::PrintToString(bad);
     }
     EXPECT_EQ(vendor_->count("createVirtualVolume"), 0);
-    for (std::string const &good : {std::string("..."), std::string("a b"), std::string("\xc3\xa4"), std::string(255, 'n')}) {
+    for (std::string const &good :
+         {std::string("..."), std::string("a b"), std::string("\xc3\xa4"), std::string(255, 'n')}) {
         EXPECT_EQ(create(good).code(), ErrorCode::Success) << good;
     }
 }
