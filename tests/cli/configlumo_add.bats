@@ -6,7 +6,7 @@ setup() {
     mounted_host
 }
 
-# profile_of DIRECTORY: what the array keeps as the volume's storage profile; size_of, vm_of: the others.
+# column_of COLUMN DIRECTORY: what the array keeps of the volume.
 column_of() {
     sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT coalesce($1, 'NULL') FROM volume WHERE directory_name = '$2'"
 }
@@ -23,20 +23,20 @@ column_of() {
     expect_done $'true\n'
     [ "$(column_of size_mb vm)" = 128 ]
     [ "$(column_of vm_uuid vm)" = 11111111-2222-3333-4444-555555555555 ]
-    [ "$(column_of profile vm)" = gold ]
+    [ "$(column_of profile vm)" = "gold;alloctype=thin" ]
 }
 
 @test "of a policy file the first line counts, and the policy parameter does not" {
     printf 'silver\ngold\n' >"$BATS_TEST_TMPDIR/policy"
     lumo configlumo add -n vm -c "$container" -f "$BATS_TEST_TMPDIR/policy" -p bronze
     expect_done $'true\n'
-    [ "$(column_of profile vm)" = silver ]
+    [ "$(column_of profile vm)" = "silver;alloctype=thin" ]
 }
 
 @test "a policy file that is missing is no failure and means no policy" {
     lumo configlumo add -n vm -c "$container" -f "$BATS_TEST_TMPDIR/nowhere" -p bronze
     expect_done $'true\n'
-    [ "$(column_of profile vm)" != bronze ]
+    [[ "$(column_of profile vm)" != *bronze* ]]
 }
 
 @test "with priority" {

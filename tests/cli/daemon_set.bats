@@ -23,7 +23,7 @@ expect_notice() {
 @test "the objects are dumped to the daemon's log" {
     lumo daemon set --dump-objects
     expect_done $'true\n'
-    grep -q "$container" "$TOVI_ROOT/log/lumod.log"
+    grep -qF '"object":"provider","name":"lab"' "$TOVI_ROOT/log/lumod.log"
 }
 
 @test "an unbind period" {
@@ -53,11 +53,16 @@ expect_notice() {
     expect_status 0
 }
 
-@test "space-efficiency commands off and on" {
+@test "with space-efficiency commands off a profile is left as it is" {
     lumo daemon set --disable-spm-space-efficiency-cmds true
     expect_done $'true\n'
+    lumo configlumo add -n plain -c "$container" -p gold
     lumo daemon set --disable-spm-space-efficiency-cmds=false
     expect_done $'true\n'
+    lumo configlumo add -n thin -c "$container" -p gold
+    expect_status 0
+    [ "$(sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT profile FROM volume WHERE directory_name IN ('plain', 'thin')
+        ORDER BY directory_name")" = $'gold\ngold;alloctype=thin' ]
 }
 
 @test "in JSON the result is true" {

@@ -12,6 +12,7 @@ setup() {
 refused="The injection rule could not be added."
 
 @test "every third operation fails" {
+    load_containers # a load with nothing to mount is one query
     lumo faultInjection rule add --fault STORAGE_FAULT --operation queryStorageContainer --frequency 3
     expect_done $'true\n'
     for expected in 0 0 1 0 0 1; do
@@ -21,11 +22,20 @@ refused="The injection rule could not be added."
     expect_err_has "STORAGE_FAULT"
 }
 
-@test "without an operation the rule is for all of them" {
+@test "without an operation the rule is for all for which the fault is legal" {
+    load_containers
     lumo faultInjection rule add -f RESOURCE_BUSY -n 1
     expect_done $'true\n'
-    lumo storagecontainer load
-    expect_failure 1 "RESOURCE_BUSY"
+    load_containers
+    lumo configlumo add -n vm -c 3f1a52de-6c1b-4b57-9a0e-2d8c7e5b9001
+    expect_failure 1 "Failed to create Config-Lumo. " "RESOURCE_BUSY"
+}
+
+@test "a fault that is not legal for the operation is refused with its cause" {
+    lumo faultInjection rule add -f RESOURCE_BUSY -o queryStorageContainer -n 1
+    expect_status 1
+    expect_out $'false\n'
+    expect_err_has "$refused" "RESOURCE_BUSY" "queryStorageContainer"
 }
 
 @test "a rule of another operation does not touch this one" {
@@ -74,7 +84,7 @@ refused="The injection rule could not be added."
     lumo faultInjection rule add -f STORAGE_FAULT -n 7
     expect_status 1
     expect_out $'false\n'
-    expect_err_has "$refused" "exists"
+    expect_err_has "$refused" "already"
 }
 
 @test "in JSON the result is a boolean" {

@@ -43,7 +43,7 @@ expect_refused() {
 @test "host store: another program's" {
     spoil "$TOVI_ROOT/host.db" foreign
     expect_refused "$TOVI_ROOT/host.db" foreign lumo orkaprovider add --vp-name lab --vp-url u
-    expect_refused "$TOVI_ROOT/host.db" foreign lumo orkacontext set --clear
+    expect_refused "$TOVI_ROOT/host.db" foreign lumo orkaprovider remove --vp-name lab
 }
 
 @test "host store: a newer version's" {

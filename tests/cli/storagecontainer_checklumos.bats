@@ -45,13 +45,6 @@ $two accessible" ]
     expect_out_has "LumoId" "Status" "$one" "accessible"
 }
 
-@test "CSV" {
-    tovi --format csv storage internal lumo storagecontainer checklumos -p "$path" -v "$one"
-    expect_status 0
-    expect_out "$(printf 'LumoId,Status\r\n%s,accessible\r\n.' "$one" | sed 's/\.$//')"$'\n' ||
-        expect_out "$(printf 'LumoId,Status\r\n%s,accessible\r\n' "$one")"
-}
-
 @test "with all paths down the volumes are inaccessible" {
     for uid in $(all_endpoints); do
         lumo daemon set --start-pe-apd "$uid"

@@ -15,7 +15,7 @@ fields='["Container Id", "Lumo UUID", "Logical Size", "Committed Size", "Unshare
     json_of virtualvolume get --container-id "$container" --uuid "$uuid"
     expect_status 0
     expect_json "list(d) == $fields"
-    expect_json "(d['Container Id'], d['Lumo UUID'], d['Logical Size'], d['Storage Profile']) == ('$container', '$uuid', 128, 'gold')"
+    expect_json "(d['Container Id'], d['Lumo UUID'], d['Logical Size'], d['Storage Profile']) == ('$container', '$uuid', 128, 'gold;alloctype=thin')"
     expect_json "type(d['Unshared Size Valid']) is bool and d['Block Size'] > 0"
 }
 
