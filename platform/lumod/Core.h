@@ -12,7 +12,7 @@
 
 namespace Lumod {
 
-struct Core : private kj::TaskSet::ErrorHandler {
+struct Core final : private kj::TaskSet::ErrorHandler {
     Core(Settings settings, Surroundings surroundings);
 
     Settings settings;

@@ -29,7 +29,7 @@ constexpr int acceptsInARow = 64;
 
 } // namespace
 
-class Server::Implementation : public kj::TaskSet::ErrorHandler {
+class Server::Implementation final : public kj::TaskSet::ErrorHandler {
 public:
     Implementation(Daemon &daemon, kj::AsyncIoContext &io, Admission admission)
         : core_(daemon.core())

@@ -33,7 +33,7 @@ struct Surroundings {
 
 struct Core;
 
-class Daemon {
+class Daemon final {
 public:
     Daemon(Settings settings, Surroundings surroundings);
     ~Daemon();
