@@ -16,6 +16,9 @@ std::string quoted(std::string const &text) {
         case '"':
             result += "\\\"";
             break;
+        case '\\':
+            result += "\\\\";
+            break;
         default:
             result += character;
         }

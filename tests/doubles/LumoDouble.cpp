@@ -163,6 +163,7 @@ int32_t LumoLib_DeactivateProvider(char const *arrayId, char const *vpName) {
 int32_t LumoLib_VendorProviderInjectFault(char const *vpName, char const *vpUrl, char const *status, int32_t count,
                                           LumoArrayFault *entries) {
     lumo().log.call("LumoLib_VendorProviderInjectFault", vpName, vpUrl, status, count, faults(count, entries));
+    lumo().faultEntries = entries;
     return lumo().injectFault.next();
 }
 

@@ -51,6 +51,7 @@ void RecordingOutput::SetResult(boost::shared_ptr<Plexa::MetaObj::MetaObject> co
 
 void RecordingOutput::Complete() {
     log_.call("Output.Complete");
+    onComplete.next();
     Output::Complete();
 }
 

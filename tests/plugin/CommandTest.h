@@ -85,6 +85,12 @@ protected:
         EXPECT_EQ(result(), rendered);
         EXPECT_TRUE(output->IsComplete());
     }
+    /// What a call leaves when completing the output failed: the result that was set before, and the message.
+    void expectMessageBehindResult(std::string const &text, std::string const &rendered) const {
+        EXPECT_EQ(output->GetMessage(), text);
+        EXPECT_EQ(result(), rendered);
+        EXPECT_FALSE(output->IsComplete());
+    }
     void TearDown() override {
         EXPECT_EQ(lumo.openSessions, leftOver.openSessions) << "open sessions";
         EXPECT_EQ(kestrel.liveHosts, leftOver.hosts) << "host interfaces";

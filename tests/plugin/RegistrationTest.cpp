@@ -5,6 +5,7 @@
 
 #include "CommandTest.h"
 #include "Declarations.h"
+#include "VendorProviderAdd.h"
 #include "plexa/AutoCli.h"
 
 using namespace PluginTest;
@@ -160,11 +161,39 @@ TEST_F(Registration, StopsAtTheFirstCommandWithoutASessionAndLeavesInternalAlone
     EXPECT_THAT(log.lines(), ElementsAre("LumoLib_Init(0, 0)"));
 }
 
-TEST_F(Registration, StopsAtALaterCommandWithoutASessionAndClosesTheSessionsBeforeIt) {
-    lumo.init.once(true).once(true).once(true).once(false);
-    EXPECT_THROW(AutoCli_RegisterNamespaces(root), Kestrel::Lib::KestrelException);
-    EXPECT_THAT(paths(), ElementsAre("storage", "storage internal"));
-    EXPECT_EQ(lumo.openSessions, 0);
+TEST_F(Registration, StopsAtAnyCommandWithoutASessionAndClosesTheSessionsBeforeIt) {
+    struct Unit {
+        char const *name;
+        unsigned line;
+    };
+    std::size_t before = 0;
+    for (Unit const &unit :
+         {Unit{"VendorProviderRemove", 35}, Unit{"VendorProviderActivate", 36}, Unit{"VendorProviderDeactivate", 36},
+          Unit{"StorageContainerLoad", 42}, Unit{"StorageContainerRemove", 31}, Unit{"StorageContainerCheckLumos", 40},
+          Unit{"DaemonCommand", 38}}) {
+        for (std::size_t i = 0; i < before; ++i) {
+            lumo.init.once(true);
+        }
+        lumo.init.once(false);
+        expectNoSession([&] { AutoCli_RegisterNamespaces(root); }, unit.name, unit.line);
+        EXPECT_THAT(paths(), ElementsAre("storage", "storage internal"));
+        EXPECT_EQ(lumo.openSessions, 0);
+        ++before;
+    }
+}
+
+using RegistrationDeathTest = Registration;
+
+// Nothing tests what is found under the two names: whoever puts a command there stops the tool.
+TEST_F(RegistrationDeathTest, StorageThatIsACommandIsFatal) {
+    auto bare = Namespace::New();
+    bare->RegisterNamespaceNode(TarselCli::LumoNamespace::VendorProviderAdd::New(), "storage");
+    EXPECT_DEATH(AutoCli_RegisterNamespaces(bare), "");
+}
+
+TEST_F(RegistrationDeathTest, InternalThatIsACommandIsFatal) {
+    storage->RegisterNamespaceNode(TarselCli::LumoNamespace::VendorProviderAdd::New(), "internal");
+    EXPECT_DEATH(AutoCli_RegisterNamespaces(root), "");
 }
 
 } // namespace

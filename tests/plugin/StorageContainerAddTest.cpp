@@ -61,6 +61,12 @@ TEST_F(ContainerAdd, ShowsAFailureWhileTheResultIsSet) {
     expectMessageAlone("no room");
 }
 
+TEST_F(ContainerAdd, ShowsAFailureWhileTheOutputCompletes) {
+    output->onComplete.throwOnce(gantryFailure("no room"));
+    run<StorageContainerAdd>();
+    expectMessageBehindResult("no room", "true");
+}
+
 TEST_F(ContainerAdd, LetsAnUnexpectedExceptionPassAndReleasesTheHost) {
     kestrel.addLumoFileSystem.throwOnce(Unexpected("surprise"));
     EXPECT_THROW(run<StorageContainerAdd>(), Unexpected);

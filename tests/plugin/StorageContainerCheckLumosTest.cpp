@@ -158,6 +158,14 @@ TEST_F(CheckLumos, ShowsAFailureWhileTheResultIsSetAndLeavesTheFileSystem) {
     expectMessageAlone("no room");
 }
 
+TEST_F(CheckLumos, ShowsAFailureWhileTheOutputCompletesAndLeavesTheFileSystem) {
+    hostAnswers({});
+    output->onComplete.throwOnce(gantryFailure("no room"));
+    run<StorageContainerCheckLumos>();
+    leftOver.fileSystems = 1;
+    expectMessageBehindResult("no room", "[]");
+}
+
 TEST_F(CheckLumos, LetsAnUnexpectedExceptionPass) {
     gold.accessibility.throwAlways(Unexpected("surprise"));
     kestrel.getLumoFileSystemByPath.always(gold);

@@ -34,7 +34,7 @@ TEST_F(ContainerLoad, MountsAContainerAndPrintsNameAndIdAsTheHostHasThem) {
     daemonExports({{Text("gold"),
                     Text("G1"),
                     Text("https://north/orka"),
-                    16777216,
+                    (int64_t{1} << 40) + 7,
                     {{Text("array-1"), Text("One"), Text("Maker"), Text("M1"), {}}}}});
     hostHas({FileSystemScript("silver")});
     FileSystemScript mounted("mount");
@@ -44,7 +44,7 @@ TEST_F(ContainerLoad, MountsAContainerAndPrintsNameAndIdAsTheHostHasThem) {
     run<StorageContainerLoad>();
     std::string const printed =
         "[StorageContainer{StorageContainer Name: \"gold on host\", StorageContainer Id: \"g-1 on host\", "
-        "Max Lumo Size (MB): 16777216, VP URL: \"https://north/orka\", Arrays: [Array{ArrayId: \"array-1\", "
+        "Max Lumo Size (MB): 1099511627783, VP URL: \"https://north/orka\", Arrays: [Array{ArrayId: \"array-1\", "
         "Name: \"One\", VendorId: \"Maker\", ModelId: \"M1\", PEInfo: []}]}]";
     expectResultAlone(printed);
     EXPECT_THAT(ranCalls, ElementsAre("StorageInfoImpl()", "LumoLib_GetStorageContainer(1, null, &null)",
@@ -99,6 +99,10 @@ TEST_F(ContainerLoad, KeepsOrderAndLeavesEveryMountButTheLastUndeleted) {
     EXPECT_THAT(adds(), ElementsAre("StorageInfoImpl.AddLumoFileSystem(\"c\", \"c-id\", [], true)",
                                     "StorageInfoImpl.AddLumoFileSystem(\"a\", \"a-id\", [], true)",
                                     "StorageInfoImpl.AddLumoFileSystem(\"b\", \"b-id\", [], true)"));
+    std::string const rest = "-id\", Max Lumo Size (MB): 0, VP URL: \"https://vp\", Arrays: []}";
+    expectResultAlone("[StorageContainer{StorageContainer Name: \"c\", StorageContainer Id: \"c" + rest +
+                      ", StorageContainer{StorageContainer Name: \"a\", StorageContainer Id: \"a" + rest +
+                      ", StorageContainer{StorageContainer Name: \"b\", StorageContainer Id: \"b" + rest + "]");
     EXPECT_THAT(callsOf("~fs"), ElementsAre("~fs(b)"));
 }
 
@@ -178,6 +182,7 @@ TEST_F(ContainerLoad, StopsAtTheFirstFailedMountAndShowsNoRows) {
     leftOver.fileSystems = 1; // the one mounted last is not released on this path
     expectMessageAlone("Error getting/adding lumo file system 'name is taken, skipping");
     EXPECT_EQ(adds().size(), 2U);
+    EXPECT_THAT(callsOf("StorageInfoImpl.Remove"), IsEmpty()) << "what is mounted stays mounted";
     EXPECT_THAT(callsOf("~"), ElementsAre("~fs(silver)", "~StorageInfoImpl()"));
     EXPECT_THAT(callsOf("LumoLib_Free"), ElementsAre("LumoLib_FreeStorageContainerResult(result)"));
 }

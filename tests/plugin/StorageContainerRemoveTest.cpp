@@ -48,6 +48,12 @@ TEST_F(ContainerRemove, ShowsAFailureWhileTheResultIsSet) {
     expectMessageAlone("no room");
 }
 
+TEST_F(ContainerRemove, ShowsAFailureWhileTheOutputCompletes) {
+    output->onComplete.throwOnce(gantryFailure("no room"));
+    run<StorageContainerRemove>();
+    expectMessageBehindResult("no room", "true");
+}
+
 TEST_F(ContainerRemove, LetsAnUnexpectedExceptionPassAndReleasesTheHost) {
     kestrel.removeLumoFileSystem.throwOnce(Unexpected("surprise"));
     EXPECT_THROW(run<StorageContainerRemove>(), Unexpected);

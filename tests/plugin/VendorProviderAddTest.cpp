@@ -136,6 +136,12 @@ TEST_F(ProviderAdd, ReportsAFailureWhileTheResultIsSet) {
     expectMessageAlone("Failed to add VP: no room");
 }
 
+TEST_F(ProviderAdd, ReportsAFailureWhileTheOutputCompletes) {
+    output->onComplete.throwOnce(gantryFailure("no room"));
+    run<VendorProviderAdd>();
+    expectMessageBehindResult("Failed to add VP: no room", "\"Succesfully Added VP with name : north\\n\"");
+}
+
 TEST_F(ProviderAdd, LetsAFailedExistenceCheckPass) {
     kestrel.lumoVpExists.throwOnce(gantryFailure("no store"));
     EXPECT_THROW(run<VendorProviderAdd>(), Gantry::Lib::GantryException);

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "VendorProviderInjectFault.h"
 
+#include <cstdlib>
+
 #include "CommandTest.h"
 
 using namespace PluginTest;
@@ -31,6 +33,19 @@ TEST_F(InjectFault, SendsStatusAndArraysWithTheRegisteredUrl) {
                             "active, \"a2\" passive])",
                             "Output.SetResult(\"Successfully Injected fault for VP with name : north\\n\")",
                             "Output.Complete()", "~StorageInfoImpl()"));
+}
+
+TEST_F(InjectFault, LeavesTheEntriesThatItAllocated) {
+    input->SetStringList("arrayid", {"a1", "a2"});
+    input->SetBoolList("isactive", {true, false});
+    run<VendorProviderInjectFault>();
+    LumoArrayFault *const entries = lumo.faultEntries;
+    ASSERT_NE(entries, nullptr);
+    EXPECT_EQ(entries[0].isActive, 1);
+    EXPECT_EQ(entries[1].isActive, 0);
+    EXPECT_EQ(entries[0].reserved, nullptr);
+    EXPECT_EQ(entries[1].reserved, nullptr);
+    std::free(entries); // ends the program if the command has released them, or has them from elsewhere
 }
 
 TEST_F(InjectFault, WithoutStatusAndArraysSendsTheDefaultStatusAndNoEntries) {

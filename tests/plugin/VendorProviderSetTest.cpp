@@ -110,6 +110,12 @@ TEST_F(ProviderSet, ReportsAFailureWhileTheResultIsSet) {
     expectMessageAlone("Failed to update VP no room");
 }
 
+TEST_F(ProviderSet, ReportsAFailureWhileTheOutputCompletes) {
+    output->onComplete.throwOnce(gantryFailure(" no room"));
+    run<VendorProviderSet>();
+    expectMessageBehindResult("Failed to update VP no room", "\"Successfully Updated VP with name : north\\n\"");
+}
+
 TEST_F(ProviderSet, ReportsANameThatExistsWithoutARecordAndWritesNothing) {
     kestrel.getLumoVendorProviders.once({});
     run<VendorProviderSet>();

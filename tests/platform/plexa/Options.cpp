@@ -159,6 +159,20 @@ TEST(Options, fault_5_ScalarsMayBeGivenOnce) {
     EXPECT_EQ(parsed({"-c", "--clear"}), "--clear is given twice");
 }
 
+TEST(Options, AParameterWithoutAnAliasHasItsLongNameAlone) {
+    auto const spec = CallSpec::InputSpec::New();
+    spec->AddParameter(CallSpec::ParameterSpec::New("start-pe-apd", CallSpec::String));
+    auto const input = CallSpec::Input::New();
+    OptionParser parser({{spec, input}});
+    for (char const *const word : {"-s", "-", "--", "--s", "-start-pe-apd"}) {
+        EXPECT_FALSE(parser.knows(word)) << word;
+    }
+    std::vector<std::string> const words = {"--start-pe-apd", "naa.1"};
+    std::size_t position = 0;
+    parser.take(words, position);
+    EXPECT_EQ(input->GetString("start-pe-apd"), "naa.1");
+}
+
 TEST(Options, MissingRequiredParametersAreAllNamed) {
     auto const spec = declaration();
     auto const input = CallSpec::Input::New();

@@ -16,7 +16,7 @@ struct Verbatim {
     std::string text;
 };
 
-/// Quotes a text; line ends, tabs and quotes inside it are escaped.
+/// Quotes a text; line ends, tabs, quotes and backslashes inside it are escaped, so that no two texts print alike.
 std::string quoted(std::string const &text);
 
 class CallLog {

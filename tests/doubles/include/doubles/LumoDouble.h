@@ -80,6 +80,8 @@ public:
     Answers<ChunksReply> unsharedChunks;
     Answers<Reply<LumoMetadata>> metadata{{0, records.metadata({})}};
 
+    /// The entries of the last fault that was injected: the caller's memory.
+    LumoArrayFault *faultEntries = nullptr;
     /// Successful opens less closes.
     int openSessions = 0;
     Unreleased unreleased;

@@ -36,8 +36,9 @@ public:
     void SetResult(boost::shared_ptr<Plexa::MetaObj::MetaObject> const &result) override;
     void Complete() override;
 
-    /// What SetResult does once it has recorded the call: nothing, or what the test has it throw.
+    /// What SetResult and Complete do once they have recorded the call: nothing, or what the test has them throw.
     Answers<Done> onSetResult;
+    Answers<Done> onComplete;
 
 private:
     CallLog &log_;
