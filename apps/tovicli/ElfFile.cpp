@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "ElfFile.h"
 
+#include <algorithm>
+#include <array>
 #include <cstring>
 #include <elf.h>
 #include <link.h>
@@ -21,7 +23,7 @@ using DynamicEntry = ElfW(Dyn);
 
 constexpr uint64_t mostSegments = 256;
 constexpr uint64_t mostDynamicBytes = 1024 * 1024;
-constexpr uint64_t mostStringBytes = 64 * 1024 * 1024;
+constexpr std::size_t mostNameBytes = 256; // a file name's
 
 /// A file's bytes, nothing outside its size.
 class Bytes {
@@ -99,19 +101,25 @@ std::optional<std::vector<std::string>> neededNames(Bytes const &bytes, std::vec
         }
     }
     std::optional<uint64_t> const stringOffset = fileOffset(segments, stringAddress);
-    if (!stringOffset || stringSize > mostStringBytes || !bytes.holds(*stringOffset, stringSize)) {
-        return std::nullopt;
-    }
-    std::string strings(stringSize, '\0');
-    if (!bytes.read(strings.data(), *stringOffset, stringSize)) {
+    if (!stringOffset || !bytes.holds(*stringOffset, stringSize)) {
         return std::nullopt;
     }
     std::vector<std::string> names;
     for (uint64_t const offset : nameOffsets) {
-        if (offset >= strings.size()) {
+        if (offset >= stringSize) {
             return std::nullopt;
         }
-        names.push_back(strings.substr(offset, strings.find('\0', offset) - offset));
+        // One name at a time: the table holds every symbol's name, which only the loader needs.
+        std::array<char, mostNameBytes> name{};
+        uint64_t const length = std::min<uint64_t>(name.size(), stringSize - offset);
+        if (!bytes.read(name.data(), *stringOffset + offset, length)) {
+            return std::nullopt;
+        }
+        std::string_view const text(name.data(), length);
+        if (text.find('\0') == std::string_view::npos) {
+            return std::nullopt;
+        }
+        names.emplace_back(text.substr(0, text.find('\0')));
     }
     return names;
 }
