@@ -69,14 +69,14 @@ column_of() {
     expect_failure 1 "Failed to create Config-Lumo. " "vm"
 }
 
-@test "a name that is no directory name" {
+@test "fault_53 a name that is no directory name" {
     for name in . .. a/b "" $'a\nb' "$(printf 'x%.0s' {1..256})"; do
         lumo configlumo add -n "$name" -c "$container"
         expect_failure 1 "Failed to create Config-Lumo. "
     done
 }
 
-@test "names that only look alike are two" {
+@test "fault_55 names that only look alike are two" {
     lumo configlumo add -n $'caf\xc3\xa9' -c "$container"
     lumo configlumo add -n $'cafe\xcc\x81' -c "$container"
     expect_done $'true\n'

@@ -64,7 +64,7 @@ bound_to() {
     expect_failure 1 "00000000-0000-0000-0000-000000000000"
 }
 
-@test "a name that leads out of the container" {
+@test "fault_53 a name that leads out of the container" {
     mkdir "$TOVI_ROOT/outside"
     lumo configlumo mount -n ../../outside -c "$container"
     [ "$status" -eq 1 ]
@@ -79,7 +79,7 @@ bound_to() {
     [ "$(cat "$directory")" = mine ]
 }
 
-@test "a symbolic link in the container's place" {
+@test "fault_54 a symbolic link in the container's place" {
     mkdir "$BATS_TEST_TMPDIR/elsewhere"
     rmdir "$TOVI_ROOT/volumes/$container_name"
     ln -s "$BATS_TEST_TMPDIR/elsewhere" "$TOVI_ROOT/volumes/$container_name"

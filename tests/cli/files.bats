@@ -34,26 +34,26 @@ expect_refused() {
     [ ! -e "$file-journal" ]
 }
 
-@test "host store: no database" {
+@test "fault_48 host store: no database" {
     spoil "$TOVI_ROOT/host.db" malformed
     expect_refused "$TOVI_ROOT/host.db" malformed lumo orkaprovider add --vp-name lab --vp-url u
     expect_refused "$TOVI_ROOT/host.db" malformed lumo orkaprovider set --vp-name lab
 }
 
-@test "host store: another program's" {
+@test "fault_51 host store: another program's" {
     spoil "$TOVI_ROOT/host.db" foreign
     expect_refused "$TOVI_ROOT/host.db" foreign lumo orkaprovider add --vp-name lab --vp-url u
     expect_refused "$TOVI_ROOT/host.db" foreign lumo orkaprovider remove --vp-name lab
 }
 
-@test "host store: a newer version's" {
+@test "fault_51 host store: a newer version's" {
     lumo orkaprovider add --vp-name lab --vp-url u
     spoil "$TOVI_ROOT/host.db" newer
     expect_refused "$TOVI_ROOT/host.db" newer lumo orkaprovider add --vp-name other --vp-url u
     expect_refused "$TOVI_ROOT/host.db" newer lumo orkaprovider remove --vp-name lab
 }
 
-@test "host store: cut off" {
+@test "fault_48 host store: cut off" {
     lumo orkaprovider add --vp-name lab --vp-url u
     spoil "$TOVI_ROOT/host.db" truncated
     expect_refused "$TOVI_ROOT/host.db" truncated lumo orkaprovider add --vp-name other --vp-url u
@@ -75,19 +75,19 @@ for_array_file() {
     expect_refused "$array" "$1" lumo storagecontainer load
 }
 
-@test "array file: no database" {
+@test "fault_48 array file: no database" {
     for_array_file malformed
 }
 
-@test "array file: another program's" {
+@test "fault_51 array file: another program's" {
     for_array_file foreign
 }
 
-@test "array file: a newer version's" {
+@test "fault_51 array file: a newer version's" {
     for_array_file newer
 }
 
-@test "array file: cut off" {
+@test "fault_48 array file: cut off" {
     for_array_file truncated
 }
 

@@ -13,7 +13,7 @@ expect_warning_once() {
     [ "$(grep -cF "$socket" "$err")" -eq 1 ] || mismatch "exactly one line that names $socket"
 }
 
-@test "help works and warns in one line that names the socket" {
+@test "fault_33 help works and warns in one line that names the socket" {
     tovi storage internal lumo storagecontainer load --help
     expect_status 0
     expect_out_has "Load All the Lumo StorageContainers exported by the VP."
@@ -37,7 +37,7 @@ expect_warning_once() {
     expect_out $'true\n'
 }
 
-@test "a command that needs the daemon fails at once with status 3, its cause and the socket" {
+@test "fault_33 a command that needs the daemon fails at once with status 3, its cause and the socket" {
     started=$EPOCHREALTIME
     lumo storagecontainer load
     [ "$(((${EPOCHREALTIME/./} - ${started/./}) / 1000))" -lt 2000 ]
@@ -83,7 +83,7 @@ expect_warning_once() {
     expect_failure 3 "Unable to load Lumo datastores: "
 }
 
-@test "a socket that nobody listens on is the same as none" {
+@test "fault_33 a socket that nobody listens on is the same as none" {
     mkdir -p "$TOVI_ROOT/run"
     python3 -c 'import socket, sys; socket.socket(socket.AF_UNIX).bind(sys.argv[1])' "$socket"
     lumo storagecontainer load

@@ -81,7 +81,7 @@ setup() {
     expect_failure 1 "Failed to add VP: " "$TOVI_ROOT/host.db"
 }
 
-@test "a store that another process holds is told after the wait" {
+@test "fault_49 a store that another process holds is told after the wait" {
     lumo orkaprovider add --vp-name lab --vp-url u
     hold_lock "$TOVI_ROOT/host.db"
     lumo orkaprovider add --vp-name other --vp-url u

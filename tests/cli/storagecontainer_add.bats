@@ -60,7 +60,7 @@ setup() {
     expect_failure 1 "nonsense"
 }
 
-@test "a name that is no directory name" {
+@test "fault_53 a name that is no directory name" {
     for name in . .. a/b "" $'a\nb' "$(printf 'x%.0s' {1..256})"; do
         lumo storagecontainer add -n "$name" -c "$container"
         [ "$status" -eq 1 ]

@@ -136,7 +136,7 @@ EOF_OUT
     [ ! -e "$TOVI_ROOT/volumes/archive" ]
 }
 
-@test "names and ids that a terminal would obey are shown, not sent" {
+@test "fault_64 names and ids that a terminal would obey are shown, not sent" {
     sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE storage_array SET name = 'a' || char(27) || '[31m' || char(13) || char(0x202e)"
     lumo storagecontainer load
     expect_status 0
@@ -144,7 +144,7 @@ EOF_OUT
     ! LC_ALL=C grep -q $'\e' "$out"
 }
 
-@test "output that cannot be written is status 4, and what was done is done" {
+@test "fault_63 output that cannot be written is status 4, and what was done is done" {
     status=0
     tovicli storage internal lumo storagecontainer load >/dev/full 2>"$err" || status=$?
     : >"$out"

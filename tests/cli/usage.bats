@@ -13,7 +13,7 @@ setup() {
     expect_failure 2 "vp-url"
 }
 
-@test "an unknown option is named, with what is near it" {
+@test "fault_5 an unknown option is named, with what is near it" {
     lumo orkaprovider add --vp-nam lab --vp-url u
     expect_failure 2 "--vp-nam" "--vp-name"
 }
@@ -30,7 +30,7 @@ setup() {
     expect_failure 2 "priority" "many" "whole number"
 }
 
-@test "a number out of 64 bits is a usage error" {
+@test "fault_4 a number out of 64 bits is a usage error" {
     lumo orkaprovider add --vp-name lab --vp-url u --arrayid a --priority 9223372036854775808 --isactive true
     expect_failure 2 "priority" "9223372036854775808"
 }
@@ -40,7 +40,7 @@ setup() {
     expect_failure 2 "enabled" "maybe" "true" "false"
 }
 
-@test "a scalar given twice is refused" {
+@test "fault_5 a scalar given twice is refused" {
     lumo orkaprovider add --vp-name lab --vp-name lab2 --vp-url u
     expect_failure 2 "vp-name"
 }

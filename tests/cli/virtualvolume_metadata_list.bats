@@ -45,7 +45,7 @@ metadata() {
     expect_out_has "key" "value" "colour" "red"
 }
 
-@test "what a terminal would obey is shown, not sent" {
+@test "fault_64 what a terminal would obey is shown, not sent" {
     metadata $'\e[31mred' $'\r\xe2\x80\xaeback'
     lumo virtualvolume metadata list -c "$container" -u "$uuid"
     expect_status 0

@@ -45,7 +45,7 @@ kill_daemon() {
     expect_err_has "$container_name, "
 }
 
-@test "killed while it creates: done or not done, never between" {
+@test "fault_27 killed while it creates: done or not done, never between" {
     mounted_host
     for attempt in 1 2 3 4 5; do
         tovicli storage internal lumo configlumo add -n "vm$attempt" -c "$container" >"$out" 2>"$err" 3>&- &
@@ -68,7 +68,7 @@ kill_daemon() {
     done
 }
 
-@test "a second daemon on the same root leaves the first undisturbed" {
+@test "fault_29 a second daemon on the same root leaves the first undisturbed" {
     mounted_host
     run -1 "$top/lab/up" --root "$TOVI_ROOT" --build "$TOVI_BUILD_DIR"
     run ! "$TOVI_BUILD_DIR/bin/lumod" --root "$TOVI_ROOT"

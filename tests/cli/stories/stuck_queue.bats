@@ -4,7 +4,7 @@
 # request with priority passes it.
 load ../helper
 
-@test "a stuck queue, reads and priority" {
+@test "fault_61 a stuck queue, reads and priority" {
     mounted_host
     "$TOVI_BUILD_DIR/bin/orkasim" make "$BATS_TEST_DIRNAME/../topologies/second.json" "$TOVI_ROOT/arrays/second.array"
     lumo orkaprovider add --vp-name second --vp-url "file://$TOVI_ROOT/arrays/second.array"
@@ -17,9 +17,12 @@ load ../helper
         >"$BATS_TEST_TMPDIR/stuck" 2>&1 3>&- &
     stuck=$!
     # The ordered queue is held as soon as an ordered request to the free array is not answered within its deadline.
-    until ! tovi --timeout 300 storage internal lumo configlumo add -n ordered -c "$second" || [ "$status" -ne 0 ]; do
+    while true; do
+        TOVI_TIMEOUT_MS=500 lumo configlumo add -n ordered -c "$second"
+        [ "$status" -eq 0 ] || break
         lumo configlumo remove -n ordered -c "$second"
     done
+    grep -qE "deadline|500 ms" "$err"
     kill -0 "$stuck"
 
     lumo daemon set --log-level info
