@@ -21,7 +21,13 @@ constexpr kj::Duration longestDeadline = 1 * kj::HOURS;
 constexpr kj::Duration writePatience = 30 * kj::SECONDS;
 /// A buffer that grew for a long request is given back after it.
 constexpr std::size_t keptBufferBytes = std::size_t{64} << 10;
-constexpr unsigned firstSegmentWords = 1024;
+/// What a message takes besides its list, and what an estimate may be short by.
+constexpr std::size_t messageWords = 1024;
+
+/// A first segment with room for about so many bytes: a message of one segment is the quickest to read.
+unsigned segmentWords(std::size_t bytes) {
+    return static_cast<unsigned>(messageWords + bytes / sizeof(capnp::word) * 9 / 8);
+}
 
 /// The client stops waiting at its deadline, so ours are before it: providers first, who can say what they were doing,
 /// then whatever else hangs.
@@ -44,7 +50,7 @@ struct Deadlines {
 Failure failureOf(kj::Exception const &exception) {
     bool const isMemory = exception.getType() == kj::Exception::Type::OVERLOADED;
     return Failure(isMemory ? ErrorCode::OutOfMemory : ErrorCode::InternalError,
-                   fmt::format("The daemon failed: {}", exception.getDescription().cStr()));
+                   fmt::format("the daemon failed: {}", exception.getDescription().cStr()));
 }
 
 } // namespace
@@ -62,7 +68,7 @@ kj::Promise<void> Connection::run() {
     return reader_.next().exclusiveJoin(kj::mv(drained)).then([this](Outcome<bool> &&got) -> kj::Promise<void> {
         if (!got.ok()) {
             core_.log.write(LogLevel::Warning, "-",
-                            fmt::format("Closed connection {}: {}", number_, got.failure().sentence()));
+                            fmt::format("closed connection {}: {}", number_, got.failure().sentence()));
             return kj::READY_NOW;
         }
         if (!got.value()) {
@@ -92,7 +98,7 @@ Wire::Request::Reader Connection::parse(uint64_t &id) {
         return request;
     } catch (kj::Exception const &exception) {
         throw Failure(ErrorCode::InvalidRequest,
-                      fmt::format("The request is malformed: {}", exception.getDescription().cStr()));
+                      fmt::format("the request is malformed: {}", exception.getDescription().cStr()));
     }
 }
 
@@ -102,7 +108,7 @@ kj::Promise<void> Connection::answer() {
     try {
         request = parse(id);
     } catch (Failure const &failure) {
-        core_.log.write(LogLevel::Warning, "-", fmt::format("Connection {}: {}", number_, failure.sentence()));
+        core_.log.write(LogLevel::Warning, "-", fmt::format("connection {}: {}", number_, failure.sentence()));
         return sendFailure(id, failure);
     }
     std::string trace = textOf(request.getTraceId());
@@ -126,10 +132,10 @@ Answer<ReplyPtr> Connection::handle(Wire::Request::Reader request, CallPtr const
                        return dispatch(core_, call, request);
                    }).catch_([](kj::Exception &&exception) -> Outcome<ReplyPtr> { return failureOf(exception); });
     auto tooLate = core_.timer.atTime(end).then([]() -> Outcome<ReplyPtr> {
-        return Failure(ErrorCode::DeadlineExceeded, "The daemon did not finish the request before its deadline");
+        return Failure(ErrorCode::DeadlineExceeded, "the daemon did not finish the request before its deadline");
     });
     auto givenUp = shutdown_.givingUp().then([]() -> Outcome<ReplyPtr> {
-        return Failure(ErrorCode::ShuttingDown, "The daemon is shutting down and did not finish the request");
+        return Failure(ErrorCode::ShuttingDown, "the daemon is shutting down and did not finish the request");
     });
     auto bounded = handled.exclusiveJoin(kj::mv(tooLate)).exclusiveJoin(kj::mv(givenUp));
     Method const *const method = methodOf(request);
@@ -137,7 +143,7 @@ Answer<ReplyPtr> Connection::handle(Wire::Request::Reader request, CallPtr const
         return bounded;
     }
     auto abandoned = stream_->whenWriteDisconnected().then([]() -> Outcome<ReplyPtr> {
-        return Failure(ErrorCode::ConnectionLost, "The client went away before it was answered");
+        return Failure(ErrorCode::ConnectionLost, "the client went away before it was answered");
     });
     return bounded.exclusiveJoin(kj::mv(abandoned));
 }
@@ -145,19 +151,19 @@ Answer<ReplyPtr> Connection::handle(Wire::Request::Reader request, CallPtr const
 void Connection::logFailure(CallPtr const &call, Wire::Request::Reader request, Failure const &failure) {
     Method const *const method = methodOf(request);
     core_.log.write(LogLevel::Info, call->trace,
-                    fmt::format("{} failed with code {}: {}", method == nullptr ? "A request" : method->name,
+                    fmt::format("{} failed with code {}: {}", method == nullptr ? "a request" : method->name,
                                 static_cast<int32_t>(failure.code()), failure.sentence()));
 }
 
 kj::Promise<void> Connection::sendAll(uint64_t id, ReplyPtr source) {
-    auto message = kj::heap<capnp::MallocMessageBuilder>(firstSegmentWords);
+    auto message = kj::heap<capnp::MallocMessageBuilder>(segmentWords(source->nextBytes()));
     auto reply = message->initRoot<Wire::Reply>();
     reply.setId(id);
     bool const more = source->next(reply);
     reply.setLast(!more);
     if (capnp::computeSerializedSizeInWords(*message) * sizeof(capnp::word) > Wire::replyBytesMax) {
         return sendFailure(
-            id, Failure(ErrorCode::MessageTooLarge, "The answer holds an element that is too large for one message"));
+            id, Failure(ErrorCode::MessageTooLarge, "the answer holds an element that is too large for one message"));
     }
     auto sent = write(kj::mv(message));
     return more ? sent.then([this, id, source = std::move(source)]() mutable { return sendAll(id, std::move(source)); })
@@ -165,7 +171,7 @@ kj::Promise<void> Connection::sendAll(uint64_t id, ReplyPtr source) {
 }
 
 kj::Promise<void> Connection::sendFailure(uint64_t id, Failure const &failure) {
-    auto message = kj::heap<capnp::MallocMessageBuilder>(firstSegmentWords);
+    auto message = kj::heap<capnp::MallocMessageBuilder>(messageWords);
     auto reply = message->initRoot<Wire::Reply>();
     reply.setId(id);
     auto builder = reply.initFailure();

@@ -21,6 +21,11 @@ public:
     /// Fills the union of the next message.
     /// @return whether more messages follow
     virtual bool next(Wire::Reply::Builder reply) = 0;
+    /// About how many bytes the next message's list takes. A message that fits its first segment is read without a
+    /// look-up for each of its texts.
+    virtual std::size_t nextBytes() const {
+        return 0;
+    }
 };
 
 using ReplyPtr = std::unique_ptr<ReplySource>;
@@ -29,6 +34,22 @@ using ReplyPtr = std::unique_ptr<ReplySource>;
 ReplyPtr singleReply(std::function<void(Wire::Reply::Builder)> fill);
 /// A reply that says that what was asked for is done.
 ReplyPtr doneReply();
+
+/// Where the chunk ends that begins with an element.
+/// @param bytesOf about how many bytes an element takes: (index) -> size_t
+/// @param bytes   set to about how many the chunk takes
+template <typename BytesOf>
+std::size_t endOfChunk(std::size_t first, std::size_t count, BytesOf const &bytesOf, std::size_t &bytes) {
+    std::size_t end = first;
+    for (bytes = 0; end < count && end - first < Wire::chunkElements; ++end) {
+        std::size_t const more = bytesOf(end);
+        if (bytes + more > Wire::chunkBytes && end > first) {
+            break;
+        }
+        bytes += more;
+    }
+    return end;
+}
 
 /// Fills at most a chunk's worth of a list into one message.
 /// @param first where the chunk begins among `count` elements
@@ -39,13 +60,8 @@ ReplyPtr doneReply();
 template <typename BytesOf, typename Init, typename Fill>
 std::size_t fillChunk(std::size_t first, std::size_t count, BytesOf const &bytesOf, Init const &init,
                       Fill const &fill) {
-    std::size_t end = first;
-    for (std::size_t bytes = 0; end < count && end - first < Wire::chunkElements; ++end) {
-        bytes += bytesOf(end);
-        if (bytes > Wire::chunkBytes && end > first) {
-            break;
-        }
-    }
+    std::size_t bytes = 0;
+    std::size_t const end = endOfChunk(first, count, bytesOf, bytes);
     auto list = init(static_cast<unsigned>(end - first));
     for (std::size_t index = first; index < end; ++index) {
         fill(list, static_cast<unsigned>(index - first), index);
@@ -67,6 +83,11 @@ public:
         at_ = fillChunk(
             at_, count_, bytesOf_, [this, &reply](unsigned size) { return init_(reply, size); }, fill_);
         return at_ < count_;
+    }
+    std::size_t nextBytes() const override {
+        std::size_t bytes = 0;
+        endOfChunk(at_, count_, bytesOf_, bytes);
+        return bytes;
     }
 
 private:

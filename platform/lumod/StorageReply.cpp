@@ -67,6 +67,18 @@ public:
         return containersTold_ < containers_.size();
     }
 
+    std::size_t nextBytes() const override {
+        std::size_t bytes = 0;
+        if (arraysTold_ < table_.size()) {
+            endOfChunk(
+                arraysTold_, table_.size(), [this](std::size_t at) { return sizeOf(*table_[at]); }, bytes);
+        } else {
+            endOfChunk(
+                containersTold_, containers_.size(), [this](std::size_t at) { return sizeOfContainer(at); }, bytes);
+        }
+        return bytes;
+    }
+
 private:
     ServedContainer const &container(std::size_t at) const {
         return view_->containers()[containers_[at]];
