@@ -46,7 +46,7 @@ constexpr std::array<option, 8> longOptions{{{"root", required_argument, nullptr
 Lumod::LogLevel levelOf(std::string_view from, std::string_view word) {
     auto const level = Lumod::logLevelNamed(word);
     if (!level) {
-        refuse(fmt::format("{}: \"{}\" is no log level; expected quiet, panic, error, warning, info, verbose or trivia",
+        refuse(fmt::format("{}: '{}' is no log level; expected quiet, panic, error, warning, info, verbose or trivia",
                            from, word));
     }
     return *level;
@@ -58,7 +58,7 @@ int64_t periodOf(std::string_view text) {
     auto const parsed = std::from_chars(text.data(), end, microseconds);
     if (parsed.ec != std::errc() || parsed.ptr != end || microseconds <= 0 ||
         microseconds > std::numeric_limits<int32_t>::max() * int64_t{1000}) {
-        refuse(fmt::format("--unbind-period: \"{}\" is no period; expected a number of microseconds above 0", text));
+        refuse(fmt::format("--unbind-period: '{}' is no period; expected a number of microseconds above 0", text));
     }
     return microseconds;
 }
@@ -68,7 +68,7 @@ gid_t groupOf(char const *name) {
     group entry{};
     group *found = nullptr;
     if (::getgrnam_r(name, &entry, buffer.data(), buffer.size(), &found) != 0 || found == nullptr) {
-        refuse(fmt::format("--group: there is no group \"{}\"", name));
+        refuse(fmt::format("--group: there is no group '{}'", name));
     }
     return entry.gr_gid;
 }
@@ -110,13 +110,13 @@ Options parseOptions(int count, char **arguments, std::string root, std::string 
             options.version = true;
             break;
         case ':':
-            refuse(fmt::format("The option {} needs a value", arguments[optind - 1]));
+            refuse(fmt::format("the option {} needs a value", arguments[optind - 1]));
         default:
-            refuse(fmt::format("Unknown option {}", arguments[optind - 1]));
+            refuse(fmt::format("unknown option {}", arguments[optind - 1]));
         }
     }
     if (optind < count) {
-        refuse(fmt::format("Unexpected argument \"{}\"", arguments[optind]));
+        refuse(fmt::format("unexpected argument '{}'", arguments[optind]));
     }
     if (options.root.empty()) {
         refuse("--root: a directory is expected");

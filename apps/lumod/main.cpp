@@ -64,7 +64,7 @@ std::string environmentText(char const *name) {
 std::function<std::string()> idempotencyKeys() {
     std::array<uint64_t, 2> random{};
     if (::getrandom(random.data(), sizeof random, 0) != static_cast<ssize_t>(sizeof random)) {
-        throw Wire::Failure(Wire::ErrorCode::InternalError, "The kernel gave no random bytes for idempotency keys");
+        throw Wire::Failure(Wire::ErrorCode::InternalError, "the kernel gave no random bytes for idempotency keys");
     }
     return [prefix = fmt::format("{:016x}{:016x}", random[0], random[1]), count = uint64_t{0}]() mutable {
         return fmt::format("{}-{}", prefix, ++count);
@@ -74,7 +74,7 @@ std::function<std::string()> idempotencyKeys() {
 kj::Promise<void> reopenLogOnHangup(kj::UnixEventPort &port, Lumod::Log &log) {
     return port.onSignal(SIGHUP).then([&port, &log](siginfo_t &&) {
         log.reopen();
-        log.write(Lumod::LogLevel::Info, "-", "Reopened the log file");
+        log.write(Lumod::LogLevel::Info, "-", "reopened the log file");
         return reopenLogOnHangup(port, log);
     });
 }

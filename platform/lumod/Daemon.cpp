@@ -31,7 +31,7 @@ Core::Core(Settings settingsGiven, Surroundings surroundings)
     , tasks(*this) {}
 
 void Core::taskFailed(kj::Exception &&exception) {
-    log.write(LogLevel::Error, "-", fmt::format("A task broke: {}", exception.getDescription().cStr()));
+    log.write(LogLevel::Error, "-", fmt::format("a task broke: {}", exception.getDescription().cStr()));
 }
 
 Answer<Done> Core::unbind(CallPtr const &call, std::string const &containerId, std::string const &uuid) {
@@ -41,13 +41,13 @@ Answer<Done> Core::unbind(CallPtr const &call, std::string const &containerId, s
     });
     return whateverCame(std::move(unbound), [this, call, uuid](Outcome<Done> outcome) -> Outcome<Done> {
         if (outcome.ok()) {
-            log.write(LogLevel::Info, call->trace, fmt::format("Unbound the virtual volume {}", uuid));
+            log.write(LogLevel::Info, call->trace, fmt::format("unbound the virtual volume {}", uuid));
             return outcome;
         }
         bool const isGone = outcome.failure().code() == Wire::ErrorCode::NoSuchVolume ||
                             outcome.failure().code() == Wire::ErrorCode::NoSuchContainer;
         log.write(isGone ? LogLevel::Info : LogLevel::Warning, call->trace,
-                  fmt::format("The virtual volume {} was not unbound: {}", uuid, outcome.failure().sentence()));
+                  fmt::format("the virtual volume {} was not unbound: {}", uuid, outcome.failure().sentence()));
         return isGone ? Outcome<Done>(Done{}) : outcome;
     });
 }

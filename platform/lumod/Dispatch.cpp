@@ -55,16 +55,16 @@ Answer<ReplyPtr> dispatch(Core &core, CallPtr const &call, Request::Reader reque
     return attempt([&]() -> Answer<ReplyPtr> {
         if (request.getVersion() != Wire::PROTOCOL_VERSION) {
             throw Failure(ErrorCode::UnsupportedVersion,
-                          fmt::format("The request speaks version {} of the protocol; this daemon speaks version {}",
+                          fmt::format("the request speaks version {} of the protocol; this daemon speaks version {}",
                                       request.getVersion(), Wire::PROTOCOL_VERSION));
         }
         Method const *const method = methodOf(request);
         if (method == nullptr) {
-            throw Failure(ErrorCode::UnknownMethod, fmt::format("This daemon does not know the request with number {}",
+            throw Failure(ErrorCode::UnknownMethod, fmt::format("this daemon does not know the request with number {}",
                                                                 static_cast<unsigned>(request.which())));
         }
         if (core.log.shows(LogLevel::Verbose)) {
-            core.log.write(LogLevel::Verbose, call->trace, fmt::format("Request {}", method->name));
+            core.log.write(LogLevel::Verbose, call->trace, fmt::format("request {}", method->name));
         }
         return method->handler(core, call, request);
     });

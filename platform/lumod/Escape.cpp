@@ -64,6 +64,17 @@ bool isUtf8(std::string_view text) {
     return true;
 }
 
+bool hasControlCharacter(std::string_view text) {
+    while (!text.empty()) {
+        Character const character = firstOf(text);
+        if (character.valid && isControl(character.codePoint)) {
+            return true;
+        }
+        text.remove_prefix(character.bytes);
+    }
+    return false;
+}
+
 std::string escaped(std::string_view text) {
     std::string result;
     result.reserve(text.size());

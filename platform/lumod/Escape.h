@@ -9,6 +9,9 @@ namespace Lumod {
 /// Whether a text is well-formed UTF-8, surrogates excluded.
 bool isUtf8(std::string_view text);
 
+/// Whether a text holds a control character of ASCII or of the range that follows it (U+0080 to U+009F).
+bool hasControlCharacter(std::string_view text);
+
 /// A text for one line of a log: control characters, invalid UTF-8 and bidirectional controls become \xNN for each of
 /// their bytes, and a backslash is doubled, so that the line can be read back without doubt.
 std::string escaped(std::string_view text);

@@ -29,7 +29,7 @@ FaultRules::Target FaultRules::targetOf(std::string_view faultName, std::string_
     auto const fault = faultNamed(faultName);
     if (!fault) {
         throw Failure(ErrorCode::UnknownFault,
-                      fmt::format("There is no fault \"{}\"; the faults are {}", faultName,
+                      fmt::format("there is no fault '{}'; the faults are {}", faultName,
                                   listOf(faultCount, [](std::size_t at) { return nameOf(static_cast<Fault>(at)); })));
     }
     if (operationName == wildcard) {
@@ -39,12 +39,12 @@ FaultRules::Target FaultRules::targetOf(std::string_view faultName, std::string_
     if (!operation) {
         throw Failure(
             ErrorCode::UnknownOperation,
-            fmt::format("There is no provider operation \"{}\"; the operations are {}", operationName,
+            fmt::format("there is no provider operation '{}'; the operations are {}", operationName,
                         listOf(operationCount, [](std::size_t at) { return nameOf(static_cast<Operation>(at)); })));
     }
     if (!isLegal(*fault, *operation)) {
         throw Failure(ErrorCode::IllegalFault,
-                      fmt::format("The fault {} is not legal for {}", faultName, operationName));
+                      fmt::format("the fault {} is not legal for {}", faultName, operationName));
     }
     return {*fault, operation};
 }
@@ -72,10 +72,10 @@ void FaultRules::add(std::string_view fault, std::string_view operation, int32_t
     Target const target = targetOf(fault, operation);
     if (frequency <= 0 && timeMs <= 0) {
         throw Failure(ErrorCode::InvalidArgument,
-                      fmt::format("The rule for {} and {} names neither a frequency nor a time", fault, operation));
+                      fmt::format("the rule for {} and {} names neither a frequency nor a time", fault, operation));
     }
     if (find(target) != nullptr) {
-        throw Failure(ErrorCode::RuleExists, fmt::format("There is a rule for {} and {} already", fault, operation));
+        throw Failure(ErrorCode::RuleExists, fmt::format("there is a rule for {} and {} already", fault, operation));
     }
     rules_.push_back({target.fault, target.operation, frequency, timeMs, 0, 0, clock_.now()});
 }
@@ -83,7 +83,7 @@ void FaultRules::add(std::string_view fault, std::string_view operation, int32_t
 void FaultRules::modify(std::string_view fault, std::string_view operation, int32_t frequency, int32_t timeMs) {
     Rule *const rule = find(targetOf(fault, operation));
     if (rule == nullptr) {
-        throw Failure(ErrorCode::NoSuchRule, fmt::format("There is no rule for {} and {}", fault, operation));
+        throw Failure(ErrorCode::NoSuchRule, fmt::format("there is no rule for {} and {}", fault, operation));
     }
     if (frequency <= 0 && timeMs <= 0) {
         rules_.erase(rules_.begin() + (rule - rules_.data()));
@@ -114,7 +114,7 @@ std::optional<Failure> FaultRules::strike(Operation operation, std::string_view 
             }
             restart(rule);
             ++rule.fired;
-            return Failure(codeOf(rule.fault), fmt::format("Injected fault {} in {} of provider \"{}\"",
+            return Failure(codeOf(rule.fault), fmt::format("injected fault {} in {} of provider '{}'",
                                                            nameOf(rule.fault), nameOf(operation), provider));
         }
     }

@@ -54,7 +54,7 @@ void HostState::read(CallPtr const &call) {
     }
     next->orkaContext = store_.orkaContext();
     log_.write(LogLevel::Verbose, call->trace,
-               fmt::format("Read the host store: {} providers, {} endpoint outages", next->providers.size(),
+               fmt::format("read the host store: {} providers, {} endpoint outages", next->providers.size(),
                            next->endpointOutages.size()));
     listener_(*next);
     snapshot_ = std::move(next);

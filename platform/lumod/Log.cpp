@@ -42,7 +42,7 @@ public:
         , descriptor_(open()) {
         if (descriptor_ < 0) {
             throw Wire::Failure(Wire::ErrorCode::IoError,
-                                fmt::format("Cannot open the log file {}: {}", path_, std::strerror(errno)));
+                                fmt::format("cannot open the log file {}: {}", path_, std::strerror(errno)));
         }
     }
     ~FileSink() override {

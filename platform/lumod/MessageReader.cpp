@@ -16,7 +16,7 @@ Answer<bool> MessageReader::next() {
         }
         // One deadline for the whole message: a byte now and then does not move it.
         auto tooSlow = timer_.afterDelay(patience).then([]() -> Outcome<bool> {
-            return Failure(ErrorCode::DeadlineExceeded, "A request was begun and not finished in time");
+            return Failure(ErrorCode::DeadlineExceeded, "a request was begun and not finished in time");
         });
         return readMessage(have).exclusiveJoin(kj::mv(tooSlow));
     });
@@ -41,7 +41,7 @@ Answer<Done> MessageReader::readExactly(std::uint8_t *place, std::size_t bytes) 
     }
     return stream_.tryRead(place, bytes, bytes).then([bytes](std::size_t got) -> Outcome<Done> {
         if (got < bytes) {
-            return Failure(ErrorCode::ConnectionLost, "The peer closed the connection in the middle of a request");
+            return Failure(ErrorCode::ConnectionLost, "the peer closed the connection in the middle of a request");
         }
         return Done{};
     });

@@ -35,7 +35,20 @@ void requireArray(Survey const &survey, ProviderEntry const &provider, std::stri
         }
     }
     throw Wire::Failure(Wire::ErrorCode::NoSuchArray,
-                        fmt::format("The provider \"{}\" has no storage array \"{}\"", provider.record.name, arrayId));
+                        fmt::format("the provider '{}' has no storage array '{}'", provider.record.name, arrayId));
+}
+
+ProviderPtr activeFor(Survey const &survey, ProviderSet const &providers, std::string const &arrayId) {
+    std::vector<ProviderPtr> candidates;
+    for (Source const &source : survey.view->sources()) {
+        if (exports(source, arrayId)) {
+            candidates.push_back(source.provider);
+        }
+    }
+    for (Absence const &absence : survey.failed) {
+        candidates.push_back(absence.provider);
+    }
+    return providers.serving(arrayId, candidates);
 }
 
 } // namespace Lumod

@@ -19,7 +19,7 @@ bool isChange(Operation operation) {
 
 /// A defect or a fault of the machine, told as what it is.
 Failure internalError(kj::Exception const &exception, std::string const &provider, Operation operation) {
-    return Failure(ErrorCode::InternalError, fmt::format("{} of provider \"{}\" broke: {}", nameOf(operation), provider,
+    return Failure(ErrorCode::InternalError, fmt::format("{} of provider '{}' broke: {}", nameOf(operation), provider,
                                                          exception.getDescription().cStr()));
 }
 
@@ -28,11 +28,11 @@ Failure internalError(kj::Exception const &exception, std::string const &provide
 std::optional<Failure> ProviderCalls::hindrance(Operation operation) const {
     std::string const &name = entry_->record.name;
     if (entry_->isOffline()) {
-        return Failure(ErrorCode::ProviderOffline, fmt::format("The provider \"{}\" is offline (injected)", name));
+        return Failure(ErrorCode::ProviderOffline, fmt::format("the provider '{}' is offline (injected)", name));
     }
     if (entry_->injected == ProviderStatus::SyncError && isChange(operation)) {
         return Failure(ErrorCode::ProviderBusy,
-                       fmt::format("The provider \"{}\" is out of sync (injected) and takes no changes", name));
+                       fmt::format("the provider '{}' is out of sync (injected) and takes no changes", name));
     }
     if (entry_->unusable) {
         return entry_->unusable;
@@ -61,7 +61,7 @@ Answer<T> ProviderCalls::perform(Operation operation, Function &&function) const
     Log &log = services_.log;
     if (log.shows(LogLevel::Trivia)) {
         log.write(LogLevel::Trivia, call_->trace,
-                  fmt::format("{} of provider \"{}\"", nameOf(operation), entry_->record.name));
+                  fmt::format("{} of provider '{}'", nameOf(operation), entry_->record.name));
     }
     auto promise = attempt([&] { return function(*entry_->provider, contextFor(operation)); });
     return promise
@@ -71,7 +71,7 @@ Answer<T> ProviderCalls::perform(Operation operation, Function &&function) const
         .then([operation, entry = entry_, call = call_, &log](Result &&result) -> Result {
             if (!result.ok()) {
                 log.write(LogLevel::Verbose, call->trace,
-                          fmt::format("{} of provider \"{}\" failed: {}", nameOf(operation), entry->record.name,
+                          fmt::format("{} of provider '{}' failed: {}", nameOf(operation), entry->record.name,
                                       result.failure().sentence()));
             }
             return std::move(result);

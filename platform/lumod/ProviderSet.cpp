@@ -62,7 +62,7 @@ ProviderPtr ProviderSet::named(std::string_view name) const {
         }
     }
     throw Wire::Failure(Wire::ErrorCode::NoSuchProvider,
-                        fmt::format("No provider is registered under the name \"{}\"", name));
+                        fmt::format("no provider is registered under the name '{}'", name));
 }
 
 ProviderPtr ProviderSet::serving(std::string const &arrayId, std::vector<ProviderPtr> const &exporters) const {

@@ -41,7 +41,7 @@ RunDirectory::RunDirectory(Wire::Paths paths, std::optional<gid_t> group)
     , group_(group) {
     mode_t const mode = group_ ? groupMode : ownMode;
     if (::mkdir(paths_.root().c_str(), rootMode) != 0 && errno != EEXIST) {
-        fail("Cannot make the root directory", paths_.root());
+        fail("cannot make the root directory", paths_.root());
     }
     makeDirectory(paths_.run(), mode);
     makeDirectory(paths_.logs(), mode);
@@ -61,21 +61,21 @@ RunDirectory::~RunDirectory() {
 
 void RunDirectory::makeDirectory(std::string const &path, mode_t mode) const {
     if (::mkdir(path.c_str(), mode) != 0 && errno != EEXIST) {
-        fail("Cannot make the directory", path);
+        fail("cannot make the directory", path);
     }
     Wire::UniqueFd const directory(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
     struct stat status {};
     if (!directory || ::fstat(directory.get(), &status) != 0) {
-        fail("Cannot open the directory", path);
+        fail("cannot open the directory", path);
     }
     if (status.st_uid != ::geteuid()) {
         return; // prepared by an administrator, who decides who may enter it
     }
     if (group_ && status.st_gid != *group_ && ::fchown(directory.get(), static_cast<uid_t>(-1), *group_) != 0) {
-        fail("Cannot give the group the directory", path);
+        fail("cannot give the group the directory", path);
     }
     if ((status.st_mode & 0777) != mode && ::fchmod(directory.get(), mode) != 0) {
-        fail("Cannot set the mode of the directory", path);
+        fail("cannot set the mode of the directory", path);
     }
 }
 
@@ -83,20 +83,20 @@ void RunDirectory::lock() {
     std::string const path = paths_.lockFile();
     lock_.reset(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
     if (!lock_) {
-        fail("Cannot open the lock file", path);
+        fail("cannot open the lock file", path);
     }
     if (::flock(lock_.get(), LOCK_EX | LOCK_NB) == 0) {
         return;
     }
     if (errno != EWOULDBLOCK) {
-        fail("Cannot lock", path);
+        fail("cannot lock", path);
     }
     std::array<char, 32> text{};
     Wire::UniqueFd const pidFile(::open(paths_.pidFile().c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
     ssize_t const bytes = pidFile ? ::read(pidFile.get(), text.data(), text.size() - 1) : 0;
     std::string const pid(text.data(), bytes > 0 ? std::strcspn(text.data(), "\n") : 0);
     throw Failure(ErrorCode::InUse,
-                  fmt::format("Another daemon{} serves {} already: it holds the lock {}",
+                  fmt::format("another daemon{} serves {} already: it holds the lock {}",
                               pid.empty() ? "" : fmt::format(" (process {})", pid), paths_.root(), path));
 }
 
@@ -109,7 +109,7 @@ void RunDirectory::writePid() const {
     std::string const text = fmt::format("{}\n", ::getpid());
     if (!file || ::write(file.get(), text.data(), text.size()) != static_cast<ssize_t>(text.size()) ||
         ::rename(next.c_str(), path.c_str()) != 0) {
-        fail("Cannot write the pid file", path);
+        fail("cannot write the pid file", path);
     }
 }
 
@@ -130,29 +130,29 @@ Wire::UniqueFd RunDirectory::bind(std::string const &path) {
     if (::lstat(path.c_str(), &status) == 0) {
         if (!S_ISSOCK(status.st_mode)) {
             errno = EEXIST;
-            fail("Something that is no socket is in the place of the socket", path);
+            fail("something that is no socket is in the place of the socket", path);
         }
         if (::unlink(path.c_str()) != 0) {
-            fail("Cannot remove the stale socket", path);
+            fail("cannot remove the stale socket", path);
         }
     }
     Wire::UniqueFd socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
     if (!socket) {
-        fail("Cannot make the socket", path);
+        fail("cannot make the socket", path);
     }
     Wire::SocketAddress const address(path);
     // Nobody can connect before the socket listens, and then its mode is set.
     if (::bind(socket.get(), address.get(), address.size()) != 0) {
-        fail("Cannot bind the socket", path);
+        fail("cannot bind the socket", path);
     }
     if (group_ && ::lchown(path.c_str(), static_cast<uid_t>(-1), *group_) != 0) {
-        fail("Cannot give the group the socket", path);
+        fail("cannot give the group the socket", path);
     }
     if (::chmod(path.c_str(), socketMode) != 0) {
-        fail("Cannot set the mode of the socket", path);
+        fail("cannot set the mode of the socket", path);
     }
     if (::listen(socket.get(), backlog) != 0) {
-        fail("Cannot listen on the socket", path);
+        fail("cannot listen on the socket", path);
     }
     return socket;
 }

@@ -90,7 +90,7 @@ private:
     void logShortage(int error) {
         if (!std::exchange(isShort_, true)) {
             core_.log.write(LogLevel::Error, "-",
-                            fmt::format("Cannot take a connection: {}; trying again", std::strerror(error)));
+                            fmt::format("cannot take a connection: {}; trying again", std::strerror(error)));
         }
     }
 
@@ -98,9 +98,9 @@ private:
         auto const peer = peerOf(client.get());
         if (!peer || !admission_.admits(*peer)) {
             core_.log.write(LogLevel::Warning, "-",
-                            peer ? fmt::format("Refused a connection of user {} (group {}, process {})", peer->uid,
+                            peer ? fmt::format("refused a connection of user {} (group {}, process {})", peer->uid,
                                                peer->gid, peer->pid)
-                                 : std::string("Refused a connection of an unknown user"));
+                                 : std::string("refused a connection of an unknown user"));
             return;
         }
         using Flags = kj::LowLevelAsyncIoProvider;
@@ -116,7 +116,7 @@ private:
         // A peer that goes away in the middle is no event; its connection is simply over.
         bool const isPeer = exception.getType() == kj::Exception::Type::DISCONNECTED;
         core_.log.write(isPeer ? LogLevel::Verbose : LogLevel::Error, "-",
-                        fmt::format("A connection ended: {}", exception.getDescription().cStr()));
+                        fmt::format("a connection ended: {}", exception.getDescription().cStr()));
     }
 
     Core &core_;

@@ -82,7 +82,7 @@ PassedSockets takePassedSockets(Wire::Paths const &paths) {
             passed.priority = std::move(socket);
         } else {
             throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
-                                fmt::format("The passed descriptor {} is no listening socket of this daemon ({})",
+                                fmt::format("the passed descriptor {} is no listening socket of this daemon ({})",
                                             descriptor, path.empty() ? "no path" : path));
         }
     }

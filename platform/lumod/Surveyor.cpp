@@ -35,14 +35,14 @@ ServedContainer const &Survey::container(std::string const &containerId) const {
     }
     if (found != nullptr) {
         throw Failure(ErrorCode::NoActiveProvider,
-                      fmt::format("No active provider serves the storage array {} of the storage container {}",
+                      fmt::format("no active provider serves the storage array {} of the storage container {}",
                                   view->arrays()[found->unserved.front()].facts->id, containerId));
     }
     if (!offline.empty()) {
         throw offline.front().reason;
     }
     throw Failure(ErrorCode::NoSuchContainer,
-                  fmt::format("No registered provider exports a storage container {}", containerId));
+                  fmt::format("no registered provider exports a storage container {}", containerId));
 }
 
 Answer<Survey> Surveyor::survey(CallPtr const &call) {
@@ -92,14 +92,14 @@ Survey Surveyor::assemble(std::vector<ProviderPtr> const &asked, kj::Array<Outco
         Failure const &failure = answers[index].failure();
         services_.log.write(
             LogLevel::Warning, call->trace,
-            fmt::format("Left out the provider \"{}\": {}", asked[index]->record.name, failure.sentence()));
+            fmt::format("left out the provider '{}': {}", asked[index]->record.name, failure.sentence()));
         survey.failed.push_back({asked[index], failure});
     }
     for (ProviderPtr const &provider : services_.providers.all()) {
         if (provider->isOffline()) {
             survey.offline.push_back(
                 {provider, Failure(ErrorCode::ProviderOffline,
-                                   fmt::format("The provider \"{}\" is offline (injected)", provider->record.name))});
+                                   fmt::format("the provider '{}' is offline (injected)", provider->record.name))});
         }
     }
     survey.view = viewOf(std::move(sources));
@@ -136,7 +136,7 @@ void Surveyor::tellContext(ProviderPtr const &provider, CallPtr const &call) {
             return;
         }
         services_.log.write(LogLevel::Warning, call->trace,
-                            fmt::format("The provider \"{}\" was not told the Orka context: {}", provider->record.name,
+                            fmt::format("the provider '{}' was not told the Orka context: {}", provider->record.name,
                                         outcome.failure().sentence()));
     }));
 }

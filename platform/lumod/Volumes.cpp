@@ -19,16 +19,6 @@ constexpr std::size_t directoryNameBytesMax = 255;
 constexpr std::string_view allocationKey = "alloctype=";
 constexpr std::string_view allocationClause = "alloctype=thin";
 
-bool hasControlCharacter(std::string const &text) {
-    for (char const character : text) {
-        auto const byte = static_cast<unsigned char>(character);
-        if (byte < 0x20 || byte == 0x7F) {
-            return true;
-        }
-    }
-    return false;
-}
-
 } // namespace
 
 std::string textOf(capnp::Text::Reader text) {
@@ -38,7 +28,7 @@ std::string textOf(capnp::Text::Reader text) {
 std::string canonicalContainerId(capnp::Text::Reader text) {
     auto const canonical = Wire::normalizeContainerId({text.begin(), text.size()});
     if (!canonical) {
-        throw Failure(ErrorCode::InvalidArgument, fmt::format("\"{}\" is no container id", escaped(textOf(text))));
+        throw Failure(ErrorCode::InvalidArgument, fmt::format("'{}' is no container id", escaped(textOf(text))));
     }
     return *canonical;
 }
@@ -52,10 +42,10 @@ std::string canonicalUuid(std::string uuid) {
 void requireDirectoryName(std::string const &name) {
     auto const refuse = [&name](char const *why) {
         throw Failure(ErrorCode::InvalidArgument,
-                      fmt::format("\"{}\" cannot be a directory's name: {}", escaped(name), why));
+                      fmt::format("'{}' cannot be a directory's name: {}", escaped(name), why));
     };
     if (name.empty()) {
-        throw Failure(ErrorCode::InvalidArgument, "A directory's name cannot be empty");
+        throw Failure(ErrorCode::InvalidArgument, "a directory's name cannot be empty");
     }
     if (name == "." || name == "..") {
         refuse("it means a directory already");
@@ -105,7 +95,7 @@ Answer<FoundVolume> Volumes::findIn(CallPtr const &call, Survey const &survey, V
                            [survey, name, provider = calls.provider()](std::optional<Orka::VirtualVolume> volume) {
                                if (!volume) {
                                    throw Failure(ErrorCode::NoSuchVolume,
-                                                 fmt::format("The storage container {} has no config volume \"{}\"",
+                                                 fmt::format("the storage container {} has no config volume '{}'",
                                                              name.containerId, name.directoryName));
                                }
                                return FoundVolume{*std::move(volume), provider, survey};

@@ -15,18 +15,18 @@ struct Wanted {
     std::string activeUrl;
 };
 
-void requireActive(Survey const &survey, Wanted const &wanted) {
+void requireActive(Survey const &survey, ProviderSet const &providers, Wanted const &wanted) {
     if (wanted.activeUrl.empty()) {
         return;
     }
-    ServedArray const *const array = survey.view->array(wanted.arrayId);
-    std::string const active = array != nullptr && array->provider ? array->provider->record.url : std::string();
+    ProviderPtr const provider = activeFor(survey, providers, wanted.arrayId);
+    std::string const active = provider ? provider->record.url : std::string();
     if (active != wanted.activeUrl) {
         throw Wire::Failure(Wire::ErrorCode::NotTheActiveProvider,
                             active.empty()
-                                ? fmt::format("No provider is active for the storage array {}, so {} is not",
+                                ? fmt::format("no provider is active for the storage array {}, so {} is not",
                                               wanted.arrayId, wanted.activeUrl)
-                                : fmt::format("The active provider of the storage array {} is at {}, not at {}",
+                                : fmt::format("the active provider of the storage array {} is at {}, not at {}",
                                               wanted.arrayId, active, wanted.activeUrl));
     }
 }
@@ -40,11 +40,11 @@ Answer<ReplyPtr> activateProvider(Core &core, CallPtr const &call, Wire::Request
     return andThen(core.surveyor.survey(call), [&core, call, wanted = std::move(wanted)](Survey survey) {
         ProviderPtr const provider = core.providers.named(wanted.providerName);
         requireArray(survey, *provider, wanted.arrayId);
-        requireActive(survey, wanted);
+        requireActive(survey, core.providers, wanted);
         core.providers.activate(*provider, wanted.arrayId);
         core.log.write(
             LogLevel::Info, call->trace,
-            fmt::format("Activated the provider \"{}\" for the storage array {}", wanted.providerName, wanted.arrayId));
+            fmt::format("activated the provider '{}' for the storage array {}", wanted.providerName, wanted.arrayId));
         return doneReply();
     });
 }

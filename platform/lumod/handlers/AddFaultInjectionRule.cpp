@@ -11,7 +11,7 @@ Answer<ReplyPtr> addFaultInjectionRule(Core &core, CallPtr const &call, Wire::Re
     std::string const operation = textOf(rule.getOperation());
     core.faults.add(fault, operation, rule.getFrequency(), rule.getTimeMs());
     core.log.write(LogLevel::Info, call->trace,
-                   fmt::format("Added the fault rule {} for {}: frequency {}, time {} ms", fault, operation,
+                   fmt::format("added the fault rule {} for {}: frequency {}, time {} ms", fault, operation,
                                rule.getFrequency(), rule.getTimeMs()));
     return Outcome<ReplyPtr>(doneReply());
 }

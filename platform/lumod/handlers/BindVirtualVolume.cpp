@@ -33,7 +33,7 @@ using BindingPtr = std::shared_ptr<Binding const>;
 
 Failure noEndpoint(Binding const &binding) {
     return Failure(ErrorCode::NoAccessibleEndpoint,
-                   fmt::format("The virtual volume {} cannot be bound: no protocol endpoint of the storage container "
+                   fmt::format("the virtual volume {} cannot be bound: no protocol endpoint of the storage container "
                                "{} is accessible",
                                binding.found.volume.uuid, binding.found.volume.containerId));
 }
@@ -54,7 +54,7 @@ Answer<ChangedVolume> bindFrom(BindingPtr const &binding, std::size_t at) {
             return Outcome<ChangedVolume>(outcome.failure());
         }
         binding->core.log.write(LogLevel::Info, binding->call->trace,
-                                fmt::format("Bound the virtual volume {} to the protocol endpoint {}",
+                                fmt::format("bound the virtual volume {} to the protocol endpoint {}",
                                             binding->found.volume.uuid, endpoint));
         return Outcome<ChangedVolume>(binding->boundTo(endpoint));
     });
@@ -72,7 +72,7 @@ Answer<ChangedVolume> bindAnew(BindingPtr const &binding) {
         return Outcome<ChangedVolume>(binding->boundTo(*current));
     }
     binding->core.log.write(LogLevel::Info, binding->call->trace,
-                            fmt::format("The virtual volume {} is bound to the protocol endpoint {}, which cannot be "
+                            fmt::format("the virtual volume {} is bound to the protocol endpoint {}, which cannot be "
                                         "used; it gets another one",
                                         binding->found.volume.uuid, *current));
     auto unbound = binding->calls().unbindVirtualVolume(binding->found.volume.containerId, binding->found.volume.uuid);

@@ -18,7 +18,7 @@ Orka::VolumeSpec specOf(Wire::CreateVirtualVolume::Reader request, bool modifies
     spec.sizeMb = request.getSizeMb();
     if (spec.sizeMb < 0) {
         throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
-                            fmt::format("A virtual volume cannot have a size of {} MB", spec.sizeMb));
+                            fmt::format("a virtual volume cannot have a size of {} MB", spec.sizeMb));
     }
     spec.profile = profileOf(textOf(request.getPolicy()), modifiesProfiles);
     spec.vmUuid = textOf(request.getVmUuid());
@@ -28,8 +28,8 @@ Orka::VolumeSpec specOf(Wire::CreateVirtualVolume::Reader request, bool modifies
 void requireRoom(ServedContainer const &container, Orka::VolumeSpec const &spec) {
     if (spec.sizeMb > container.facts->maxLumoSizeMb) {
         throw Wire::Failure(Wire::ErrorCode::TooLarge,
-                            fmt::format("A virtual volume of {} MB is larger than the {} MB that the storage "
-                                        "container \"{}\" allows",
+                            fmt::format("a virtual volume of {} MB is larger than the {} MB that the storage "
+                                        "container '{}' allows",
                                         spec.sizeMb, container.facts->maxLumoSizeMb, container.facts->name));
     }
 }
@@ -41,8 +41,8 @@ Answer<ChangedVolume> create(Core &core, CallPtr const &call, Orka::VolumeSpec s
         auto created = ProviderCalls(core.services, container.provider, call).createVirtualVolume(spec);
         return andThen(std::move(created), [&core, call](Orka::VirtualVolume volume) {
             core.log.write(LogLevel::Info, call->trace,
-                           fmt::format("Created the virtual volume {} (\"{}\") in the storage container {}",
-                                       volume.uuid, volume.directoryName, volume.containerId));
+                           fmt::format("created the virtual volume {} ('{}') in the storage container {}", volume.uuid,
+                                       volume.directoryName, volume.containerId));
             return ChangedVolume{volume.uuid, volume.directoryName, volume.boundTo.value_or("")};
         });
     });

@@ -17,7 +17,7 @@ Answer<ReplyPtr> deactivateProvider(Core &core, CallPtr const &call, Wire::Reque
         requireArray(survey, *provider, arrayId);
         core.providers.deactivate(*provider, arrayId);
         core.log.write(LogLevel::Info, call->trace,
-                       fmt::format("Deactivated the provider \"{}\" for the storage array {}", providerName, arrayId));
+                       fmt::format("deactivated the provider '{}' for the storage array {}", providerName, arrayId));
         return doneReply();
     });
 }

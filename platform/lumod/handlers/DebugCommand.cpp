@@ -29,11 +29,11 @@ Answer<ReplyPtr> debugCommand(Core &core, CallPtr const &call, Wire::Request::Re
     if (command.getLogLevel() >= 0) {
         LogLevel const level = requestedLevel(command.getLogLevel());
         core.log.setLevel(level);
-        core.log.writeAlways(call->trace, fmt::format("The log level is {}", nameOf(level)));
+        core.log.writeAlways(call->trace, fmt::format("the log level is {}", nameOf(level)));
     }
     if (periodUs > 0) {
         core.unbindTimer.setPeriod(periodUs * kj::MICROSECONDS);
-        core.log.write(LogLevel::Info, call->trace, fmt::format("The unbind period is {} us", periodUs));
+        core.log.write(LogLevel::Info, call->trace, fmt::format("the unbind period is {} us", periodUs));
     }
     auto unbound = periodUs == 0 ? core.unbindTimer.unbindAll(call) : Answer<Done>(Outcome<Done>(Done{}));
     bool const wantsDump = command.getDump() > 0;

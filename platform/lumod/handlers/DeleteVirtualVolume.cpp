@@ -22,7 +22,7 @@ Answer<ChangedVolume> deleteFound(Core &core, CallPtr const &call, FoundVolume f
     return core.unbindTimer.cancel(found.volume.uuid).then([&core, call, found = std::move(found)] {
         ProviderCalls const calls(core.services, found.provider, call);
         return andThen(unbindAndDelete(calls, found.volume), [&core, call, volume = found.volume](Done) {
-            core.log.write(LogLevel::Info, call->trace, fmt::format("Deleted the virtual volume {}", volume.uuid));
+            core.log.write(LogLevel::Info, call->trace, fmt::format("deleted the virtual volume {}", volume.uuid));
             return ChangedVolume{volume.uuid, volume.directoryName, {}};
         });
     });

@@ -19,7 +19,7 @@ void requireArrays(View const &view, ServedContainer const &container, std::vect
         if (!holds) {
             throw Wire::Failure(
                 Wire::ErrorCode::NoSuchArray,
-                fmt::format("The storage container {} is not on a storage array \"{}\"", container.facts->id, arrayId));
+                fmt::format("the storage container {} is not on a storage array '{}'", container.facts->id, arrayId));
         }
     }
 }

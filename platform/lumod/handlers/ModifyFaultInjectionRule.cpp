@@ -12,8 +12,8 @@ Answer<ReplyPtr> modifyFaultInjectionRule(Core &core, CallPtr const &call, Wire:
     core.faults.modify(fault, operation, rule.getFrequency(), rule.getTimeMs());
     core.log.write(LogLevel::Info, call->trace,
                    rule.getFrequency() <= 0 && rule.getTimeMs() <= 0
-                       ? fmt::format("Removed the fault rule {} for {}", fault, operation)
-                       : fmt::format("Changed the fault rule {} for {}: frequency {}, time {} ms", fault, operation,
+                       ? fmt::format("removed the fault rule {} for {}", fault, operation)
+                       : fmt::format("changed the fault rule {} for {}: frequency {}, time {} ms", fault, operation,
                                      rule.getFrequency(), rule.getTimeMs()));
     return Outcome<ReplyPtr>(doneReply());
 }

@@ -34,7 +34,7 @@ std::unordered_set<uint32_t> arraysOf(Survey const &survey, std::string const &u
     }
     if (places.empty()) {
         throw Wire::Failure(Wire::ErrorCode::NoSuchEndpoint,
-                            fmt::format("No registered provider has a protocol endpoint \"{}\"", uid));
+                            fmt::format("no registered provider has a protocol endpoint '{}'", uid));
     }
     return places;
 }
@@ -69,7 +69,7 @@ Answer<ReplyPtr> protocolEndpointEvent(Core &core, CallPtr const &call, Wire::Re
         std::unordered_set<uint32_t> const arrays = arraysOf(survey, uid);
         core.outages.note(uid, apd);
         core.log.write(LogLevel::Warning, call->trace,
-                       fmt::format("All paths down {} on the protocol endpoint {}", apd ? "begins" : "ends", uid));
+                       fmt::format("all paths down {} on the protocol endpoint {}", apd ? "begins" : "ends", uid));
         return replyOf(containersOn(*survey.view, arrays));
     });
 }

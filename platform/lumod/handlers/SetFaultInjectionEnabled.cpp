@@ -7,7 +7,7 @@ Answer<ReplyPtr> setFaultInjectionEnabled(Core &core, CallPtr const &call, Wire:
     bool const enabled = request.getSetFaultInjectionEnabled();
     core.faults.setEnabled(enabled);
     core.log.write(LogLevel::Warning, call->trace,
-                   enabled ? "Fault injection is enabled" : "Fault injection is disabled");
+                   enabled ? "fault injection is enabled" : "fault injection is disabled");
     return Outcome<ReplyPtr>(doneReply());
 }
 

@@ -7,8 +7,8 @@ Answer<ReplyPtr> setSpaceEfficiencyManipulationEnabled(Core &core, CallPtr const
     bool const enabled = request.getSetSpaceEfficiencyManipulationEnabled();
     core.services.modifiesProfiles = enabled;
     core.log.write(LogLevel::Info, call->trace,
-                   enabled ? "Storage profiles are modified for space efficiency"
-                           : "Storage profiles are left as they are given");
+                   enabled ? "storage profiles are modified for space efficiency"
+                           : "storage profiles are left as they are given");
     return Outcome<ReplyPtr>(doneReply());
 }
 

@@ -15,7 +15,7 @@ Answer<ReplyPtr> unbindVirtualVolume(Core &core, CallPtr const &call, Wire::Requ
             if (volume.boundTo) {
                 core.unbindTimer.defer(volume.containerId, volume.uuid);
                 core.log.write(LogLevel::Info, call->trace,
-                               fmt::format("The virtual volume {} waits to be unbound", volume.uuid));
+                               fmt::format("the virtual volume {} waits to be unbound", volume.uuid));
             }
             return ChangedVolume{volume.uuid, volume.directoryName, volume.boundTo.value_or("")};
         });

@@ -16,7 +16,7 @@ ProviderSet::Injection injectionOf(Wire::VendorProviderInjectFault::Reader reque
         injection.status = providerStatusNamed(status);
         if (!injection.status) {
             throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
-                                fmt::format("\"{}\" is no provider status; those are online, offline, syncError, "
+                                fmt::format("'{}' is no provider status; those are online, offline, syncError, "
                                             "unknown, and default to take an injection back",
                                             status));
         }
@@ -30,8 +30,8 @@ ProviderSet::Injection injectionOf(Wire::VendorProviderInjectFault::Reader reque
 void requireUrl(ProviderEntry const &provider, std::string const &url) {
     if (!url.empty() && url != provider.record.url) {
         throw Wire::Failure(Wire::ErrorCode::NoSuchProvider,
-                            fmt::format("The provider \"{}\" is registered with the URL {}, not {}",
-                                        provider.record.name, provider.record.url, url));
+                            fmt::format("the provider '{}' is registered with the URL {}, not {}", provider.record.name,
+                                        provider.record.url, url));
     }
 }
 
@@ -50,12 +50,12 @@ Answer<ReplyPtr> vendorProviderInjectFault(Core &core, CallPtr const &call, Wire
         for (auto const &flag : injection.flags) {
             if (!provider->mayServe(flag.first)) {
                 throw Wire::Failure(Wire::ErrorCode::NoSuchArray,
-                                    fmt::format("The provider \"{}\" has no storage array \"{}\"", name, flag.first));
+                                    fmt::format("the provider '{}' has no storage array '{}'", name, flag.first));
             }
         }
         core.providers.inject(*provider, injection);
         core.log.write(LogLevel::Warning, call->trace,
-                       fmt::format("Injected into the provider \"{}\": status {}, {} array flags", name,
+                       fmt::format("injected into the provider '{}': status {}, {} array flags", name,
                                    injection.status ? nameOf(*injection.status) : takesBack.data(),
                                    injection.flags.size()));
         return doneReply();

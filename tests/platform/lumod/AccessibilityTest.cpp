@@ -148,7 +148,7 @@ TEST_F(AccessibilityTest, AnEventTellsTheContainersOfTheEndpoint) {
 TEST_F(AccessibilityTest, AnEventOfAnUnknownEndpointIsRefused) {
     Reply const reply = event("e9", true);
     EXPECT_EQ(reply.code(), ErrorCode::NoSuchEndpoint);
-    EXPECT_THAT(reply.sentence(), testing::HasSubstr("\"e9\""));
+    EXPECT_THAT(reply.sentence(), testing::HasSubstr("'e9'"));
 }
 
 } // namespace

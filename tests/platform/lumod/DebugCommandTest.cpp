@@ -45,7 +45,7 @@ TEST_F(DebugCommandTest, TheLogLevelChangesWhatIsLogged) {
     EXPECT_FALSE(sink_.holds("queryStorageArray"));
     logLevel(64);
     containers();
-    EXPECT_TRUE(sink_.holds("trivia trace-1 queryStorageArray of provider \"vp\""));
+    EXPECT_TRUE(sink_.holds("trivia trace-1 queryStorageArray of provider 'vp'"));
     logLevel(4);
     sink_.text.clear();
     inject("vp", "offline");

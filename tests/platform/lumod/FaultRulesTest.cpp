@@ -104,7 +104,7 @@ TEST_F(FaultRulesTest, TheSentenceNamesFaultOperationAndProvider) {
     rules_.add("LOST_SESSION", "setContext", 1, -1);
     rules_.setEnabled(true);
     EXPECT_EQ(rules_.strike(Operation::SetContext, "vp")->sentence(),
-              "Injected fault LOST_SESSION in setContext of provider \"vp\"");
+              "injected fault LOST_SESSION in setContext of provider 'vp'");
 }
 
 TEST_F(FaultRulesTest, NothingStrikesOrCountsWhileDisabledAndRulesAreKept) {

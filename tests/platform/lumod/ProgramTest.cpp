@@ -223,7 +223,7 @@ TEST_F(ProgramTest, fault_29_ASecondDaemonExitsAndTheFirstGoesOn) {
     first.firstLine();
     Ended const second = run(usual());
     EXPECT_EQ(second.status, 1);
-    EXPECT_EQ(second.err, "lumod: Another daemon (process " + std::to_string(first.pid()) + ") serves " + root_.path() +
+    EXPECT_EQ(second.err, "lumod: another daemon (process " + std::to_string(first.pid()) + ") serves " + root_.path() +
                               " already: it holds the lock " + paths_.lockFile() + "\n");
     EXPECT_TRUE(answers());
 }

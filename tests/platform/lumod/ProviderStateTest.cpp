@@ -67,10 +67,20 @@ TEST_F(ProviderStateTest, TheUrlMustBeThatOfTheActiveProvider) {
     EXPECT_THAT(containers(), ElementsAre("gold@fake:two[a1]"));
 }
 
+TEST_F(ProviderStateTest, AProviderThatDiedIsStillTheActiveOneToTakeOverFrom) {
+    addTwins(9, 1);
+    vendors_.at("fake:one")
+        ->failing.emplace("queryStorageArray", Wire::Failure(ErrorCode::ProviderUnreachable, "the wire is cut"));
+    EXPECT_EQ(activate("two", "a1", "fake:two").code(), ErrorCode::NotTheActiveProvider);
+    EXPECT_EQ(activate("two", "a1", "fake:one").code(), ErrorCode::Success);
+    vendors_.at("fake:one")->failing.clear();
+    EXPECT_THAT(containers(), ElementsAre("gold@fake:two[a1]"));
+}
+
 TEST_F(ProviderStateTest, UnknownProvidersAndArraysAreNamed) {
     addTwins(1, 2);
     EXPECT_EQ(activate("three", "a1").code(), ErrorCode::NoSuchProvider);
-    EXPECT_THAT(activate("three", "a1").sentence(), HasSubstr("\"three\""));
+    EXPECT_THAT(activate("three", "a1").sentence(), HasSubstr("'three'"));
     EXPECT_EQ(activate("one", "a9").code(), ErrorCode::NoSuchArray);
     EXPECT_EQ(deactivate("three", "a1").code(), ErrorCode::NoSuchProvider);
     EXPECT_EQ(deactivate("one", "a9").code(), ErrorCode::NoSuchArray);
@@ -110,7 +120,7 @@ TEST_F(ProviderStateTest, RequestsForAVolumeOfAnOfflineProviderFailWithThat) {
     inject("vp", "offline");
     Reply const reply = volumeRequest("info", uuid);
     EXPECT_EQ(reply.code(), ErrorCode::ProviderOffline);
-    EXPECT_THAT(reply.sentence(), HasSubstr("\"vp\""));
+    EXPECT_THAT(reply.sentence(), HasSubstr("'vp'"));
 }
 
 TEST_F(ProviderStateTest, AProviderOutOfSyncIsReadButTakesNoChanges) {
@@ -154,7 +164,7 @@ TEST_F(ProviderStateTest, InjectionRefusesWhatItDoesNotKnow) {
     addTwins(9, 1);
     Reply const badWord = inject("one", "Offline");
     EXPECT_EQ(badWord.code(), ErrorCode::InvalidArgument);
-    EXPECT_THAT(badWord.sentence(), HasSubstr("\"Offline\""));
+    EXPECT_THAT(badWord.sentence(), HasSubstr("'Offline'"));
     EXPECT_EQ(inject("three", "offline").code(), ErrorCode::NoSuchProvider);
     EXPECT_EQ(inject("one", "offline", {{"a9", true}}).code(), ErrorCode::NoSuchArray);
     Reply const otherUrl = ask([](Wire::Request::Builder request) {

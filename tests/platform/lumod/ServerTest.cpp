@@ -194,7 +194,7 @@ TEST_F(ServerTest, fault_57_AnotherUserIsRefusedAndLogged) {
     turn();
     EXPECT_TRUE(client->isClosed());
     EXPECT_FALSE(client->takeMessage().has_value());
-    EXPECT_TRUE(sink_.holds("Refused a connection of user 65534"));
+    EXPECT_TRUE(sink_.holds("refused a connection of user 65534"));
 }
 
 TEST_F(ServerTest, fault_60_AFloodingClientDoesNotKeepTheOthersOut) {
@@ -240,7 +240,7 @@ TEST_F(ServerTest, fault_62_WithoutDescriptorsItWaitsAndGoesOn) {
     ASSERT_EQ(::setrlimit(RLIMIT_NOFILE, &none), 0);
     turn();
     EXPECT_EQ(waiting.receive(), "");
-    EXPECT_TRUE(sink_.holds("Cannot take a connection"));
+    EXPECT_TRUE(sink_.holds("cannot take a connection"));
     EXPECT_EQ(ask(first, framed(ping, 3)).id, 3U) << "who is in is served";
     ASSERT_EQ(::setrlimit(RLIMIT_NOFILE, &limit), 0);
     advance(100 * kj::MILLISECONDS);

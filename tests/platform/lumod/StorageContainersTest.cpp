@@ -88,7 +88,7 @@ TEST_F(StorageContainersTest, AFailingProviderIsLeftOutWhenOthersAnswer) {
     addVendor("dead")->failing.emplace("queryStorageArray",
                                        Wire::Failure(ErrorCode::ProviderUnreachable, "the wire is cut"));
     EXPECT_THAT(containers(), ElementsAre("gold@fake:vp[a1]"));
-    EXPECT_TRUE(sink_.holds("trace-1 Left out the provider \"dead\": the wire is cut"));
+    EXPECT_TRUE(sink_.holds("trace-1 left out the provider 'dead': the wire is cut"));
 }
 
 TEST_F(StorageContainersTest, WhenNoProviderAnswersTheFirstFailureIsTold) {
