@@ -22,6 +22,12 @@ ProviderPtr ProviderSet::make(Store::Provider const &record) const {
 }
 
 void ProviderSet::apply(std::vector<Store::Provider> const &records) {
+    bool const same =
+        std::equal(entries_.begin(), entries_.end(), records.begin(), records.end(),
+                   [](ProviderPtr const &entry, Store::Provider const &record) { return entry->record == record; });
+    if (same) {
+        return; // the store changes with every mount, and all that is known of the providers' containers stays good
+    }
     std::unordered_map<std::string_view, ProviderPtr> known;
     for (ProviderPtr const &entry : entries_) {
         known.emplace(entry->record.name, entry);
