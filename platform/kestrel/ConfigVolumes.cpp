@@ -83,6 +83,10 @@ void ConfigVolumes::mount(std::string const &name, std::string const &uuid) {
 void ConfigVolumes::place(LumoClient::Volume const &bound) {
     // What a provider calls its volumes becomes part of a path here.
     requireDirectoryName(bound.uuid, "volume uuid");
+    if (bound.directoryName.empty()) {
+        throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
+                            "the virtual volume " + bound.uuid + " is no config volume: it has no directory name");
+    }
     requireDirectoryName(bound.directoryName, "directory name");
     VolumeDirectories directories(host_);
     Store::HostStore::Change change(host_.store);

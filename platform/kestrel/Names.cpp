@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Names.h"
 
+#include <string_view>
+
 #include <boost/locale/utf.hpp>
 
 #include "wire/ContainerId.h"
@@ -19,6 +21,21 @@ bool isControl(boost::locale::utf::code_point point) {
     return point < 0x20 || (point >= 0x7f && point < 0xa0);
 }
 
+/// A name for a sentence: line ends and other control characters of one byte become \xNN.
+std::string inOneLine(std::string const &name) {
+    constexpr std::string_view digits = "0123456789abcdef";
+    std::string shown;
+    for (char const character : name) {
+        auto const byte = static_cast<unsigned char>(character);
+        if (byte >= 0x20 && byte != 0x7f) {
+            shown += character;
+        } else {
+            shown += {'\\', 'x', digits[byte >> 4U], digits[byte & 0xfU]};
+        }
+    }
+    return shown;
+}
+
 void requirePrintableUtf8(std::string const &name, std::string const &what) {
     for (auto next = name.begin(); next != name.end();) {
         auto const point = boost::locale::utf::utf_traits<char>::decode(next, name.end());
@@ -26,7 +43,7 @@ void requirePrintableUtf8(std::string const &name, std::string const &what) {
             refuse(name, what, "is not valid UTF-8");
         }
         if (isControl(point)) {
-            refuse(name, what, "has a control character in it");
+            refuse(inOneLine(name), what, "has a control character in it");
         }
     }
 }

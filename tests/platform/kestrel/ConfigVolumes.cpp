@@ -37,6 +37,10 @@ TEST_F(ConfigVolumesTest, CreationTellsTheDaemonAndDoesNotMount) {
     EXPECT_TRUE(stored().mounts().empty());
 }
 
+TEST_F(ConfigVolumesTest, ARefusedNameIsShownInOneLine) {
+    EXPECT_EQ(messageOf([&] { mount("a\nb\x7f"); }), "the directory name 'a\\x0ab\\x7f' has a control character in it");
+}
+
 TEST_F(ConfigVolumesTest, ANegativeSizeIsRefused) {
     std::string uuid;
     EXPECT_EQ(messageOf([&] { gold_->CreateConfigLumo("dir", "", -1, "", uuid, "", false); }),
@@ -136,6 +140,15 @@ TEST_F(ConfigVolumesTest, AMountedVolumeIsNotMountedTwice) {
     EXPECT_EQ(messageOf([&] { mount("dir"); }),
               "the config volume 'dir' (" + uuid + ") is mounted already in the storage container 'gold'");
     EXPECT_EQ(daemon_->takeRequests(), std::vector<std::string>{"bind /dir"}) << "stays bound";
+}
+
+TEST_F(ConfigVolumesTest, AVolumeWithoutADirectoryNameIsNotMounted) {
+    std::string const uuid = "a1b20001-1111-4aaa-8aaa-000000000003";
+    daemon_->addVolume(uuid, containerId, "");
+    daemon_->takeRequests();
+    EXPECT_EQ(messageOf([&] { mount("", uuid); }),
+              "the virtual volume " + uuid + " is no config volume: it has no directory name");
+    EXPECT_EQ(daemon_->takeRequests(), (std::vector<std::string>{"bind " + uuid + "/", "unbind " + uuid + "/"}));
 }
 
 TEST_F(ConfigVolumesTest, WhatIsNotMountedIsNotUnmounted) {
