@@ -8,6 +8,7 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 #include <unistd.h>
+#include <utility>
 
 namespace Bench {
 
@@ -46,7 +47,7 @@ RawSession::~RawSession() {
     close(fd_);
 }
 
-void RawSession::prepare(std::function<void(Wire::Request::Builder)> const &fill) {
+void RawSession::prepare(Fill const &fill, Look const &look) {
     capnp::MallocMessageBuilder message;
     auto request = message.initRoot<Wire::Request>();
     request.setVersion(Wire::PROTOCOL_VERSION);
@@ -71,8 +72,16 @@ void RawSession::prepare(std::function<void(Wire::Request::Builder)> const &fill
         if (reply.isFailure()) {
             throw std::runtime_error(std::string("the daemon refused: ") + reply.getFailure().getSentence().cStr());
         }
+        if (look) {
+            look(reply);
+        }
         last = reply.getLast();
     }
+}
+
+void RawSession::prepare(std::vector<std::byte> request, size_t replyCount) {
+    request_ = std::move(request);
+    replyCount_ = replyCount;
 }
 
 size_t RawSession::ask() {

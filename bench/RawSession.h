@@ -21,12 +21,20 @@ public:
     RawSession(RawSession const &) = delete;
     RawSession &operator=(RawSession const &) = delete;
 
+    using Fill = std::function<void(Wire::Request::Builder)>;
+    using Look = std::function<void(Wire::Reply::Reader)>;
+
     /// What ask() sends from now on. Asks once, reading the replies with care, to learn how many there are.
-    void prepare(std::function<void(Wire::Request::Builder)> const &fill);
+    void prepare(Fill const &fill, Look const &look = {});
+    /// The same with a request that was serialized before, and the number of its replies.
+    void prepare(std::vector<std::byte> request, size_t replyCount);
     /// Sends the request and reads as many reply messages as the first time. @return the bytes read.
     size_t ask();
     size_t replyCount() const {
         return replyCount_;
+    }
+    std::vector<std::byte> const &request() const {
+        return request_;
     }
 
 private:
