@@ -14,7 +14,7 @@
 
 namespace Lumod {
 
-/// What a provider is made to look like (see docs of the daemon's states in this folder's README).
+/// What a provider is made to look like; the README of this folder tells what each state does.
 enum class ProviderStatus { Online, Offline, SyncError, Unknown };
 
 std::optional<ProviderStatus> providerStatusNamed(std::string_view word);
