@@ -241,7 +241,9 @@ void Tool::tell(Outcome const &outcome) {
         // One line instead of message, cause and warning, which would say the same three times.
         message = withoutLineEnd(message);
         std::string const &sentence = outcome.cause->sentence;
-        message += contains(message, sentence) ? "" : ": " + sentence;
+        if (!contains(message, sentence)) {
+            message += (message.ends_with('.') ? " " : ": ") + sentence;
+        }
         message += contains(message, socketPath()) ? "" : " (" + socketPath() + ")";
         message += startHint();
     }

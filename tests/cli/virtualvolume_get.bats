@@ -74,5 +74,5 @@ fields='["Container Id", "Lumo UUID", "Logical Size", "Committed Size", "Unshare
 @test "without a daemon it fails with its cause" {
     host_down
     lumo virtualvolume get -c "$container" -u "$uuid"
-    expect_failure 3 "$TOVI_ROOT/run/lumod.sock"
+    expect_failure 3 "Failed to get space stats for Lumo. no daemon answers at $TOVI_ROOT/run/lumod.sock"
 }
