@@ -45,6 +45,15 @@ ServedContainer const &Survey::container(std::string const &containerId) const {
                   fmt::format("no registered provider exports a storage container {}", containerId));
 }
 
+CallPtr Surveyor::inquiryOf(CallPtr const &call, std::size_t providers) const {
+    if (providers < 2) {
+        return call;
+    }
+    Call inquiry = *call;
+    inquiry.deadline -= (call->deadline - services_.timer.now()) / 2;
+    return std::make_shared<Call const>(std::move(inquiry));
+}
+
 Answer<Survey> Surveyor::survey(CallPtr const &call) {
     return andThen(services_.host.current(call), [this, call](std::shared_ptr<HostSnapshot const>) -> Answer<Survey> {
         std::vector<ProviderPtr> asked;
@@ -54,9 +63,10 @@ Answer<Survey> Surveyor::survey(CallPtr const &call) {
             }
         }
         auto answers = kj::heapArrayBuilder<Answer<Source>>(asked.size());
+        CallPtr const inquiry = inquiryOf(call, asked.size());
         for (ProviderPtr const &provider : asked) {
             tellContext(provider, call);
-            answers.add(ask(provider, call, attemptsForAgreement));
+            answers.add(ask(provider, inquiry, attemptsForAgreement));
         }
         return kj::joinPromises(answers.finish())
             .then([this, call, asked = std::move(asked)](kj::Array<Outcome<Source>> &&sources) {

@@ -46,6 +46,9 @@ public:
     Answer<Survey> survey(CallPtr const &call);
 
 private:
+    /// What the providers are asked under. Where there are several, a silent one may use half of the time only, so that
+    /// the rest can still be done on the others.
+    CallPtr inquiryOf(CallPtr const &call, std::size_t providers) const;
     Answer<Source> ask(ProviderPtr const &provider, CallPtr const &call, int attemptsLeft) const;
     Survey assemble(std::vector<ProviderPtr> const &asked, kj::Array<Outcome<Source>> answers, CallPtr const &call);
     std::shared_ptr<View const> viewOf(std::vector<Source> sources);

@@ -48,6 +48,17 @@ TEST_F(StorageContainersTest, ARecordWithArraysServesOnlyThose) {
     EXPECT_THAT(containers(), ElementsAre("silver@fake:vp[a2]"));
 }
 
+TEST_F(StorageContainersTest, OfSeveralProvidersNoneMayUseAllOfTheTime) {
+    auto const alone = addVendor("alone", {});
+    containers();
+    EXPECT_EQ(alone->contexts.back().deadline, timer_.now() + 30 * kj::SECONDS);
+    auto const other = addVendor("other", {});
+    containers();
+    for (auto const &vendor : {alone, other}) {
+        EXPECT_EQ(vendor->contexts.back().deadline, timer_.now() + 15 * kj::SECONDS);
+    }
+}
+
 TEST_F(StorageContainersTest, AContainerWithoutArraysIsExported) {
     auto const vendor = addUsualVendor();
     vendor->containers = {containerOf(1, "bare", {})};
