@@ -2,7 +2,6 @@
 #include <cerrno>
 #include <fstream>
 #include <istream>
-#include <iterator>
 #include <system_error>
 
 #include "Commands.h"
@@ -14,8 +13,20 @@ namespace Orkasim {
 
 namespace {
 
+/// Ten times what a hundred thousand containers take; a device without an end is refused here.
+constexpr std::size_t mostBytes = std::size_t{256} << 20;
+
 std::string readAll(std::istream &stream, std::string const &name) {
-    std::string text{std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+    constexpr std::size_t blockBytes = std::size_t{1} << 20;
+    std::string text;
+    std::string block(blockBytes, '\0');
+    while (stream.read(block.data(), blockBytes) || stream.gcount() > 0) {
+        text.append(block, 0, static_cast<std::size_t>(stream.gcount()));
+        if (text.size() > mostBytes) {
+            throw Wire::Failure(Wire::ErrorCode::TooLarge,
+                                "the topology '" + name + "' is larger than the 256 MiB that one may be");
+        }
+    }
     if (stream.bad()) {
         throw Wire::Failure(Wire::ErrorCode::IoError, "the topology '" + name + "' cannot be read");
     }

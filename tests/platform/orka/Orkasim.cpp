@@ -78,6 +78,12 @@ TEST_F(OrkasimTest, tellsWhyATopologyCannotBeRead) {
     EXPECT_EQ(err_, "orkasim: " + at("empty.json") + ": line 1, column 1: The document is empty.\n");
 }
 
+TEST_F(OrkasimTest, refusesATopologyWithoutAnEnd) {
+    EXPECT_EQ(run({"make", "/dev/zero", at("x.array")}), 1);
+    EXPECT_EQ(err_, "orkasim: the topology '/dev/zero' is larger than the 256 MiB that one may be\n");
+    EXPECT_EQ(filesInDirectory(), (std::vector<std::string>{"t.json"}));
+}
+
 TEST_F(OrkasimTest, showsWhatAnArrayFileHolds) {
     makeArray("x.array");
     Orka::ArrayFile(at("x.array")).setHostContext("ne\x1bxa");
