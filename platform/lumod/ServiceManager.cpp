@@ -2,10 +2,12 @@
 #include "lumod/ServiceManager.h"
 
 #include <array>
+#include <charconv>
 #include <cstddef>
 #include <cstdlib>
 #include <cstring>
 #include <string_view>
+#include <system_error>
 
 #include <fcntl.h>
 #include <sys/socket.h>
@@ -50,13 +52,20 @@ std::string_view lastPart(std::string_view path) {
     return slash == std::string_view::npos ? path : path.substr(slash + 1);
 }
 
-int passedCount() {
-    char const *const pid = std::getenv("LISTEN_PID");
-    char const *const count = std::getenv("LISTEN_FDS");
-    if (pid == nullptr || count == nullptr || std::atol(pid) != static_cast<long>(::getpid())) {
+/// 0 for what is absent or no number.
+int numberOf(char const *variable) {
+    char const *const text = std::getenv(variable);
+    int number = 0;
+    if (text == nullptr) {
         return 0;
     }
-    return std::atoi(count);
+    auto const end = text + std::strlen(text);
+    auto const result = std::from_chars(text, end, number);
+    return result.ec == std::errc() && result.ptr == end ? number : 0;
+}
+
+int passedCount() {
+    return numberOf("LISTEN_PID") == ::getpid() ? numberOf("LISTEN_FDS") : 0;
 }
 
 } // namespace

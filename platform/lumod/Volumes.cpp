@@ -35,8 +35,8 @@ std::string canonicalContainerId(capnp::Text::Reader text) {
 
 std::string canonicalUuid(std::string uuid) {
     // A volume's id is a UUID, spelled like a container's.
-    auto const canonical = Wire::normalizeContainerId(uuid);
-    return canonical ? *canonical : std::move(uuid);
+    auto canonical = Wire::normalizeContainerId(uuid);
+    return canonical ? *std::move(canonical) : uuid;
 }
 
 void requireDirectoryName(std::string const &name) {
