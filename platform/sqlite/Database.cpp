@@ -74,6 +74,10 @@ void Database::open(Options const &options) {
             std::make_unique<SQLite::Database>(fileName(path_), flags, static_cast<int>(options.busyTimeout.count()));
         sqlite3_extended_result_codes(handle_->getHandle(), 1);
     } catch (SQLite::Exception const &cause) {
+        // Two makers of one file can trip over each other once.
+        if (mode_ == Mode::Create && cause.getErrorCode() == SQLITE_CANTOPEN && attemptsToOpen_-- > 0) {
+            return open(options);
+        }
         int const reason = whyNotOpen(path_);
         if (reason == ENOENT && mode_ != Mode::Create) {
             throw Error(ErrorKind::Missing, named(identity_.kindName, path_) + " does not exist");

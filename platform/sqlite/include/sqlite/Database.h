@@ -113,6 +113,7 @@ private:
     std::unique_ptr<SQLite::Database> handle_;
     /// Statements that no query uses now; several of one text when queries of it were nested.
     std::unordered_map<std::string, std::vector<Statement>, TextHash, std::equal_to<>> idle_;
+    int attemptsToOpen_ = 8;
 };
 
 } // namespace Sqlite
