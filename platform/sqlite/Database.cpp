@@ -53,7 +53,7 @@ Database::Database(std::string const &path, Identity const &identity, Mode mode,
     if (path.empty() || path.find('\0') != std::string::npos) {
         throw Error(ErrorKind::Missing, named(identity.kindName, path) + " cannot be opened: no such file name");
     }
-    open(options);
+    open(options, false);
     try {
         checkIdentity();
         configure();
@@ -64,7 +64,7 @@ Database::Database(std::string const &path, Identity const &identity, Mode mode,
 
 Database::~Database() = default;
 
-void Database::open(Options const &options) {
+void Database::open(Options const &options, bool openedAgain) {
     int flags = SQLite::OPEN_READWRITE | SQLite::OPEN_NOMUTEX;
     if (mode_ == Mode::Create) {
         flags |= SQLite::OPEN_CREATE;
@@ -74,11 +74,12 @@ void Database::open(Options const &options) {
             std::make_unique<SQLite::Database>(fileName(path_), flags, static_cast<int>(options.busyTimeout.count()));
         sqlite3_extended_result_codes(handle_->getHandle(), 1);
     } catch (SQLite::Exception const &cause) {
-        // Two makers of one file can trip over each other once.
-        if (mode_ == Mode::Create && cause.getErrorCode() == SQLITE_CANTOPEN && attemptsToOpen_-- > 0) {
-            return open(options);
-        }
         int const reason = whyNotOpen(path_);
+        if (reason == 0 && cause.getErrorCode() == SQLITE_CANTOPEN && !openedAgain) {
+            // There is a file by now: another process has made it since SQLite looked.
+            open(options, true);
+            return;
+        }
         if (reason == ENOENT && mode_ != Mode::Create) {
             throw Error(ErrorKind::Missing, named(identity_.kindName, path_) + " does not exist");
         }

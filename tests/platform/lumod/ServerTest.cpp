@@ -230,7 +230,8 @@ TEST_F(ServerTest, fault_60_AFloodingClientDoesNotKeepTheOthersOut) {
 
 TEST_F(ServerTest, fault_62_WithoutDescriptorsItWaitsAndGoesOn) {
 #ifdef SANITIZERS_NEED_DESCRIPTORS
-    GTEST_SKIP() << "the undefined-behaviour sanitizer opens a pipe to look at an object and takes a refusal for a fault";
+    GTEST_SKIP()
+        << "the undefined-behaviour sanitizer opens a pipe to look at an object and takes a refusal for a fault";
 #endif
     RawClient first(orderedPath());
     ask(first, framed(ping));

@@ -98,7 +98,7 @@ private:
         }
     };
 
-    void open(Options const &options);
+    void open(Options const &options, bool openedAgain);
     void checkIdentity();
     void configure();
     void createLayout();
@@ -113,7 +113,6 @@ private:
     std::unique_ptr<SQLite::Database> handle_;
     /// Statements that no query uses now; several of one text when queries of it were nested.
     std::unordered_map<std::string, std::vector<Statement>, TextHash, std::equal_to<>> idle_;
-    int attemptsToOpen_ = 8;
 };
 
 } // namespace Sqlite
