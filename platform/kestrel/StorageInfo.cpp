@@ -8,6 +8,7 @@
 #include "Names.h"
 #include "VolumeDirectories.h"
 #include "kestrel/Storage.h"
+#include "lumolib/Progress.h"
 
 namespace Kestrel::Storage {
 namespace {
@@ -116,6 +117,8 @@ std::vector<Gantry::Storage::LumoFileSystem *> StorageInfoImpl::GetLumoFileSyste
         for (auto &fileSystem : owned) {
             fileSystems.push_back(fileSystem.release());
         }
+        // Whoever mounts what a list of containers names asks this first, and leaves these out.
+        LumoPlatform_NoteNotNeeded(fileSystems.size());
         return fileSystems;
     });
 }
@@ -129,6 +132,7 @@ Gantry::Storage::LumoFileSystem *StorageInfoImpl::AddLumoFileSystem(std::string 
         std::string const containerId = requireContainerId(id);
         host->client.findStorageContainer(containerId, arrayIds);
         addToHost(*host, {name, containerId, arrayIds}, mount);
+        LumoPlatform_NoteOneDone();
         id = containerId;
         return new LumoFileSystem(host, name, containerId);
     });

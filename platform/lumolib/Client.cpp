@@ -5,6 +5,7 @@
 #include <optional>
 
 #include "Connection.h"
+#include "lumolib/Progress.h"
 #include "wire/Limits.h"
 #include "wire/Paths.h"
 
@@ -203,6 +204,7 @@ std::vector<std::uint8_t> Client::checkLumoAccessibility(std::string const &cont
                 }
             });
         first += count;
+        LumoPlatform_NoteProgress(first, lumoIds.size());
         if (result.size() != first) {
             throw ordered_->unexpected("it answered the accessibility of " + std::to_string(result.size()) +
                                        " volumes instead of " + std::to_string(first));

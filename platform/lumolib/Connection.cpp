@@ -142,6 +142,8 @@ void Connection::connect(Wire::Deadline deadline) {
 void Connection::request(Repeat repeat, Wire::Deadline deadline, Fill fill, Take take) {
     capnp::word scratch[scratchWords] = {};
     reader_.reset();
+    traffic_ = Traffic();
+    RequestTrace trace(socketPath_, requestId_, traffic_);
     try {
         capnp::MallocMessageBuilder message(kj::arrayPtr(scratch, scratchWords));
         Wire::Request::Builder request = message.initRoot<Wire::Request>();
@@ -150,6 +152,7 @@ void Connection::request(Repeat repeat, Wire::Deadline deadline, Fill fill, Take
         request.setDeadlineMs(static_cast<std::uint32_t>(remainder(deadline).count()));
         request.setTraceId(textOf(requestId_));
         fill(request);
+        traffic_.method = static_cast<std::uint16_t>(request.which());
         answerComplete_ = true; // until a request is on its way
         Wire::Reply::Reader reply = ask(message, repeat, deadline);
         take(reply);
@@ -162,7 +165,14 @@ void Connection::request(Repeat repeat, Wire::Deadline deadline, Fill fill, Take
         if (exception.getType() == kj::Exception::Type::OVERLOADED) {
             throw std::bad_alloc();
         }
+        trace.failed(ErrorCode::ProtocolError);
         throw unexpected("its reply is malformed");
+    } catch (Failure const &failure) {
+        trace.failed(failure.code());
+        if (!answerComplete_) {
+            close();
+        }
+        throw;
     } catch (...) {
         if (!answerComplete_) {
             close(); // what is left of the answer would be taken for the next one
@@ -210,6 +220,7 @@ Wire::Reply::Reader Connection::askOnce(capnp::MessageBuilder &message, Wire::De
     answerComplete_ = false;
     try {
         Wire::send(socket_.get(), message, Wire::requestBytesMax, deadline, &sentBytes);
+        traffic_.sentBytes = sentBytes;
     } catch (Failure const &failure) {
         if (failure.code() == ErrorCode::MessageTooLarge) {
             answerComplete_ = true;
@@ -247,6 +258,8 @@ Wire::Reply::Reader Connection::nextReply(Wire::Deadline deadline) {
         throw explained(failure);
     }
     answerBytes_ += buffer_.bodyBytes();
+    traffic_.receivedBytes = answerBytes_;
+    ++traffic_.replies;
     if (answerBytes_ > Wire::answerBytesMax) {
         throw unexpected("its answer is larger than " + std::to_string(Wire::answerBytesMax) + " bytes");
     }

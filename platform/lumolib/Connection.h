@@ -12,6 +12,7 @@
 #include <capnp/serialize.h>
 #include <kj/function.h>
 
+#include "RequestTrace.h"
 #include "lumolib/Client.h"
 #include "wire/Framing.h"
 #include "wire/UniqueFd.h"
@@ -68,6 +69,7 @@ private:
     Wire::UniqueFd socket_;
     std::uint64_t lastId_ = 0;
     std::uint64_t answerBytes_ = 0;
+    Traffic traffic_;
     bool answerComplete_ = true;
     Wire::MessageBuffer buffer_;
     std::optional<capnp::SegmentArrayMessageReader> reader_;

@@ -3,6 +3,7 @@
 
 #include "Session.h"
 #include "StorageRecords.h"
+#include "lumolib/Progress.h"
 
 using namespace LumoClient;
 
@@ -16,6 +17,7 @@ LumoErrorEx LumoLib_GetStorageContainer(int32_t, void const *, StorageContainerR
             [](Wire::Request::Builder request) { request.setGetStorageContainer(); },
             [&records](Wire::Reply::Reader reply) { records.take(reply); });
         records.finish(*owned);
+        LumoPlatform_NoteProgress(0, owned->containerCount);
         *result = owned.release();
     });
 }
