@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <array>
+
 namespace Tovicli {
 
 /// What the process ends with. Scripts rely on the numbers.
@@ -14,7 +16,27 @@ enum class ExitStatus : int {
     Unavailable = 3,
     /// The output could not be written; the work may have been done.
     Unwritten = 4,
+    /// Plus the signal's number, as shells count.
+    EndedBySignal = 128,
+    /// The same for SIGINT, which Ctrl-C sends.
     Interrupted = 130,
 };
+
+/// One status and what it means, for help and manual.
+struct ExitMeaning {
+    char const *status;
+    char const *meaning;
+};
+
+constexpr std::array<ExitMeaning, 8> exitMeanings{{
+    {"0", "completed"},
+    {"1", "the command reported a failure: output left incomplete, a false result, a message"},
+    {"2", "usage: a mistake in the command line; nothing was done"},
+    {"3", "the daemon or a plug-in is not to be had, or did not answer in time"},
+    {"4", "the output could not be written; the work may have been done"},
+    {"129", "ended by SIGHUP; part of the work may have been done"},
+    {"130", "interrupted (SIGINT, Ctrl-C); part of the work may have been done"},
+    {"143", "ended by SIGTERM; part of the work may have been done"},
+}};
 
 } // namespace Tovicli

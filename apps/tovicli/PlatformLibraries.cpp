@@ -6,6 +6,8 @@
 #include <utility>
 
 #include "lumolib/LastFailure.h"
+#include "lumolib/Progress.h"
+#include "lumolib/Trace.h"
 
 namespace Tovicli {
 
@@ -25,6 +27,12 @@ char const *ourVersionOf(std::string_view needed) {
         }
     }
     return nullptr;
+}
+
+extern "C" void passOn(void *context, LumoRequestTrace const *request) {
+    auto const &receiver = *static_cast<std::function<void(RequestDone const &)> *>(context);
+    receiver({request->method, request->requestId, request->socketPath, request->sentBytes, request->receivedBytes,
+              request->replies, request->code, std::chrono::microseconds(request->microseconds)});
 }
 
 } // namespace
@@ -82,6 +90,27 @@ void PlatformLibraries::clearLastFailure() const {
         reinterpret_cast<decltype(&LumoPlatform_ClearLastFailure)>(functionOf("LumoPlatform_ClearLastFailure"));
     if (clear != nullptr) {
         clear();
+    }
+}
+
+ProgressFunction PlatformLibraries::startProgress() const {
+    auto const note = reinterpret_cast<decltype(&LumoPlatform_NoteProgress)>(functionOf("LumoPlatform_NoteProgress"));
+    if (note == nullptr) {
+        return nullptr;
+    }
+    note(0, 0);
+    return reinterpret_cast<decltype(&LumoPlatform_Progress)>(functionOf("LumoPlatform_Progress"));
+}
+
+void PlatformLibraries::traceRequests(std::function<void(RequestDone const &)> receiver) {
+    auto const trace =
+        reinterpret_cast<decltype(&LumoPlatform_TraceRequests)>(functionOf("LumoPlatform_TraceRequests"));
+    if (trace != nullptr) {
+        trace(nullptr, nullptr);
+        receiver_ = std::move(receiver);
+        if (receiver_) {
+            trace(passOn, &receiver_);
+        }
     }
 }
 

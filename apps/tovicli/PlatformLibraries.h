@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
@@ -24,6 +25,8 @@ public:
     /// What the client library of the daemon noted; a substitute for it may keep nothing.
     std::optional<LastFailure> lastFailure() const;
     void clearLastFailure() const;
+    ProgressFunction startProgress() const;
+    void traceRequests(std::function<void(RequestDone const &)> receiver);
 
 private:
     std::string load(std::string const &name);
@@ -31,6 +34,7 @@ private:
 
     std::string directory_;
     std::map<std::string, void *> loaded_;
+    std::function<void(RequestDone const &)> receiver_;
 };
 
 } // namespace Tovicli

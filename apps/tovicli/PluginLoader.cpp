@@ -17,6 +17,10 @@ std::string loaderText() {
     return text != nullptr ? text : "unknown error";
 }
 
+std::chrono::microseconds since(std::chrono::steady_clock::time_point began) {
+    return std::chrono::duration_cast<std::chrono::microseconds>(std::chrono::steady_clock::now() - began);
+}
+
 /// Calls an entry point. @return why it failed, empty when it did not
 template <typename Call>
 std::string reasonOf(Call const &call) {
@@ -41,7 +45,7 @@ Registration PluginLoader::registerInto(boost::shared_ptr<Plexa::AutoCli::Namesp
     Directory &loaded = load(directory);
     Registration registration;
     registration.troubles = loaded.troubles;
-    for (Plugin const &plugin : loaded.plugins) {
+    for (Plugin &plugin : loaded.plugins) {
         registerPlugin(plugin, root, environment, registration);
     }
     return registration;
@@ -60,10 +64,12 @@ PluginLoader::Directory &PluginLoader::load(std::string const &path) {
     }
     loaded.troubles = std::move(opened.skipped);
     for (PluginFile &file : opened.files) {
-        Plugin plugin{file.name, nullptr};
+        Plugin plugin{file.name, nullptr, {}};
+        auto const began = std::chrono::steady_clock::now();
         if (std::string const problem = loadPlugin(file, plugin.entry); !problem.empty()) {
             loaded.troubles.push_back("plug-in '" + file.name + "' skipped: " + problem);
         } else {
+            plugin.loading = since(began);
             loaded.plugins.push_back(std::move(plugin));
         }
     }
@@ -95,9 +101,10 @@ std::string PluginLoader::loadPlugin(PluginFile &file, EntryPoint &entry) {
     return {};
 }
 
-void PluginLoader::registerPlugin(Plugin const &plugin, boost::shared_ptr<Plexa::AutoCli::Namespace> &root,
+void PluginLoader::registerPlugin(Plugin &plugin, boost::shared_ptr<Plexa::AutoCli::Namespace> &root,
                                   Environment &environment, Registration &registration) {
-    std::string reason = reasonOf([&] {
+    auto const began = std::chrono::steady_clock::now();
+    std::string const reason = reasonOf([&] {
         try {
             plugin.entry(root);
         } catch (Kestrel::Lib::KestrelException const &) {
@@ -111,6 +118,7 @@ void PluginLoader::registerPlugin(Plugin const &plugin, boost::shared_ptr<Plexa:
             plugin.entry(root);
         }
     });
+    registration.plugins.push_back({plugin.name, std::exchange(plugin.loading, {}), since(began)});
     if (!reason.empty()) {
         registration.troubles.push_back("plug-in '" + plugin.name + "' failed: " + reason);
     }
@@ -122,6 +130,14 @@ std::optional<LastFailure> PluginLoader::lastFailure() {
 
 void PluginLoader::clearLastFailure() {
     platform_.clearLastFailure();
+}
+
+ProgressFunction PluginLoader::startProgress() {
+    return platform_.startProgress();
+}
+
+void PluginLoader::traceRequests(std::function<void(RequestDone const &)> receiver) {
+    platform_.traceRequests(std::move(receiver));
 }
 
 } // namespace Tovicli

@@ -24,6 +24,8 @@ public:
                               Environment &environment) override;
     std::optional<LastFailure> lastFailure() override;
     void clearLastFailure() override;
+    ProgressFunction startProgress() override;
+    void traceRequests(std::function<void(RequestDone const &)> receiver) override;
 
 private:
     using EntryPoint = void (*)(boost::shared_ptr<Plexa::AutoCli::Namespace> &root);
@@ -31,6 +33,7 @@ private:
     struct Plugin {
         std::string name;
         EntryPoint entry = nullptr;
+        std::chrono::microseconds loading{0}; ///< 0 once it has been told
     };
     struct Directory {
         std::vector<Plugin> plugins;
@@ -40,8 +43,8 @@ private:
     Directory &load(std::string const &path);
     /// @return why the file is not used; empty when its entry point is at hand
     std::string loadPlugin(PluginFile &file, EntryPoint &entry);
-    void registerPlugin(Plugin const &plugin, boost::shared_ptr<Plexa::AutoCli::Namespace> &root,
-                        Environment &environment, Registration &registration);
+    void registerPlugin(Plugin &plugin, boost::shared_ptr<Plexa::AutoCli::Namespace> &root, Environment &environment,
+                        Registration &registration);
 
     PlatformLibraries platform_;
     uid_t user_;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Settings.h"
 
+#include <algorithm>
 #include <charconv>
 
 #include <boost/algorithm/string/case_conv.hpp>
@@ -85,6 +86,24 @@ std::optional<std::string> logLevel(CallSpec::Input const &options, Environment 
                      " is no log level; there is quiet, panic, error, warning, info, verbose, trivia");
 }
 
+/// Names the run in the daemon's log, in error documents and traces; so nothing that would have to be escaped there.
+std::optional<std::string> requestId(Environment const *environment) {
+    constexpr std::size_t longest = 128;
+    std::optional<std::string> const id = environment != nullptr ? environment->get("TOVI_REQUEST_ID") : std::nullopt;
+    if (!id || id->empty()) {
+        return std::nullopt;
+    }
+    bool const isPlain = std::all_of(id->begin(), id->end(), [](char c) {
+        return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == '-' || c == '_' ||
+               c == '.' || c == ':';
+    });
+    if (!isPlain || id->size() > longest) {
+        throw UsageError("TOVI_REQUEST_ID: " + shownWord(*id) +
+                         " is no request id; at most 128 letters, digits and any of -_.: are expected");
+    }
+    return id;
+}
+
 std::string path(CallSpec::Input const &options, Environment const *environment, Defaults const &defaults,
                  std::string const &option, std::string const &variable, std::string const &fallback) {
     std::optional<Source> const source = lookUp(options, environment, option, variable);
@@ -151,6 +170,7 @@ Settings settingsFrom(CallSpec::Input const &options, Environment const *environ
     settings.root = path(options, environment, defaults, "root", "TOVI_ROOT", "/var/lib/tovi");
     settings.timeoutMs = timeout(options, environment);
     settings.logLevel = logLevel(options, environment);
+    settings.requestId = requestId(environment);
     settings.pluginDirectory =
         path(options, environment, defaults, "plugins", "TOVI_PLUGINS", defaults.pluginDirectory);
     settings.version = options.GetBool("version");

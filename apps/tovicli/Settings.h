@@ -20,6 +20,7 @@ struct Settings {
     int64_t timeoutMs = 0;
     std::optional<std::string> logLevel; ///< lower case
     std::string pluginDirectory;
+    std::optional<std::string> requestId; ///< empty: a fresh one
     bool version = false;
     bool help = false;
 

@@ -3,6 +3,8 @@
 
 #include <exception>
 
+#include "Hints.h"
+
 #include "plexa/Text.h"
 #include "plexa/TreeHelp.h"
 #include "plexa/UsageError.h"
@@ -34,20 +36,13 @@ void checkWords(std::vector<std::string> const &words) {
 
 MapEnvironment copied(Environment const &environment) {
     MapEnvironment copy;
-    for (char const *name :
-         {"TOVI_FORMAT", "TOVI_LOG_LEVEL", "TOVI_OFFLINE", "TOVI_PLUGINS", "TOVI_ROOT", "TOVI_TIMEOUT_MS"}) {
+    for (char const *name : {"TOVI_FORMAT", "TOVI_LOG_LEVEL", "TOVI_OFFLINE", "TOVI_PLUGINS", "TOVI_REQUEST_ID",
+                             "TOVI_ROOT", "TOVI_TIMEOUT_MS"}) {
         if (std::optional<std::string> const value = environment.get(name)) {
             copy.set(name, *value);
         }
     }
     return copy;
-}
-
-std::string withoutLineEnd(std::string text) {
-    if (text.ends_with('\n')) {
-        text.pop_back();
-    }
-    return text;
 }
 
 bool contains(std::string const &text, std::string const &part) {
@@ -58,18 +53,51 @@ bool saysDaemonDead(std::optional<LastFailure> const &cause) {
     return cause && cause->code == static_cast<int32_t>(Wire::ErrorCode::DaemonNotRunning);
 }
 
+/// Counts what goes through.
+class CountingSink : public Sink {
+public:
+    explicit CountingSink(Sink &to)
+        : to_(to) {}
+    void write(std::string_view text) override {
+        bytes_ += static_cast<int64_t>(text.size());
+        to_.write(text);
+    }
+    std::string problem() const override {
+        return to_.problem();
+    }
+    int64_t bytes() const {
+        return bytes_;
+    }
+
+private:
+    Sink &to_;
+    int64_t bytes_ = 0;
+};
+
 } // namespace
 
 Tool::Tool(Context &context)
     : context_(context)
-    , report_(context.errors) {}
+    , report_(context.errors)
+    , trace_(context.errors, context.clock) {}
 
 ExitStatus Tool::run(std::vector<std::string> const &arguments) {
+    ExitStatus const status = runReported(arguments);
+    report_.finish();
+    if (trace_.isEnabled()) {
+        context_.plugins.traceRequests({});
+        Trace::Event(trace_, "end").number("status", static_cast<int64_t>(status));
+    }
+    return status;
+}
+
+ExitStatus Tool::runReported(std::vector<std::string> const &arguments) {
     try {
         if (arguments.empty()) {
             throw UsageError("the argument list is empty, the program's name is expected first");
         }
         std::vector<std::string> const words(arguments.begin() + 1, arguments.end());
+        report_.setMachine(looksMachine(words));
         checkWords(words);
         return runWords(words);
     } catch (UsageError const &mistake) {
@@ -110,6 +138,7 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
         }
     }
     apply(full);
+    traceParsed(line);
     for (std::string const &trouble : registration_.troubles) {
         report_.warn(trouble);
     }
@@ -133,14 +162,22 @@ Tool::Root Tool::grow(Settings const &settings) {
     storage->SetDescription("Storage commands.");
     root->RegisterNamespaceNode(storage, "storage");
     registration_ = context_.plugins.registerInto(root, settings.pluginDirectory, context_.environment);
+    for (RegisteredPlugin const &plugin : registration_.plugins) {
+        Trace::Event(trace_, "plugin")
+            .text("name", plugin.name)
+            .duration("loadMs", plugin.loading)
+            .duration("registerMs", plugin.registering);
+    }
     return root;
 }
 
 void Tool::apply(Settings const &settings) {
     settings_ = settings;
     if (requestId_.empty()) {
-        requestId_ = context_.newRequestId();
+        requestId_ = settings.requestId ? *settings.requestId : context_.newRequestId();
+        report_.setRequestId(requestId_);
     }
+    startTrace(settings.logLevel);
     Environment &environment = context_.environment;
     environment.set("TOVI_ROOT", settings.root);
     environment.set("TOVI_TIMEOUT_MS", std::to_string(settings.timeoutMs));
@@ -153,6 +190,49 @@ void Tool::apply(Settings const &settings) {
     bool const machine = settings.format && findFormat(*settings.format)->isMachine;
     report_.setMachine(machine);
     report_.setShowRequestId(settings.logLevel == "verbose" || settings.logLevel == "trivia");
+}
+
+void Tool::startTrace(std::optional<std::string> const &logLevel) {
+    bool const wanted = logLevel == "trivia";
+    if (wanted && !trace_.isEnabled()) {
+        trace_.setEnabled(true);
+        Trace::Event(trace_, "run").text("version", version).text("request", requestId_);
+    }
+    trace_.setEnabled(wanted);
+}
+
+void Tool::traceParsed(CommandLine const &line) {
+    if (!trace_.isEnabled()) {
+        return;
+    }
+    Trace::Event(trace_, "parsed")
+        .text("path", line.node->GetPathString(' '))
+        .text("root", settings_.root)
+        .number("timeoutMs", settings_.timeoutMs);
+    context_.plugins.traceRequests([this](RequestDone const &done) {
+        Trace::Event(trace_, "call")
+            .text("method", done.method)
+            .text("request", done.requestId)
+            .text("socket", done.socketPath)
+            .number("sentBytes", static_cast<int64_t>(done.sentBytes))
+            .number("receivedBytes", static_cast<int64_t>(done.receivedBytes))
+            .number("replies", done.replies)
+            .number("code", done.code)
+            .duration("tookMs", done.took);
+    });
+}
+
+bool Tool::looksMachine(std::vector<std::string> const &words) const {
+    std::string format = context_.privileged ? "" : context_.environment.get("TOVI_FORMAT").value_or("");
+    for (std::size_t i = 0; i < words.size(); ++i) {
+        if (words[i].starts_with("--format=")) {
+            format = words[i].substr(std::string_view("--format=").size());
+        } else if (words[i] == "--format" && i + 1 < words.size()) {
+            format = words[i + 1];
+        }
+    }
+    Format const *const known = findFormat(format);
+    return known != nullptr && known->isMachine;
 }
 
 ExitStatus Tool::misread(Misread const &mistake) {
@@ -199,12 +279,41 @@ ExitStatus Tool::runCommand(AutoCli::Command &command, CommandLine const &line) 
     report_.setMachine(format.isMachine);
     FormatSettings const formatting = formatSettings(command, schema);
 
-    Outcome const outcome = call(command, line.input, context_.plugins);
+    Outcome const outcome = work(command, line);
     if (outcome.result != nullptr) {
-        format.write({outcome.result, schema}, formatting, context_.output);
+        CountingSink counted(context_.output);
+        std::chrono::microseconds const began = trace_.isEnabled() ? trace_.elapsed() : std::chrono::microseconds(0);
+        format.write({outcome.result, schema}, formatting, trace_.isEnabled() ? counted : context_.output);
+        if (trace_.isEnabled()) {
+            Trace::Event(trace_, "output")
+                .text("format", format.name)
+                .number("bytes", counted.bytes())
+                .duration("tookMs", trace_.elapsed() - began);
+        }
     }
     tell(outcome);
     return written(outcome.status, outcome.status == ExitStatus::Completed ? "; the command itself was completed" : "");
+}
+
+Outcome Tool::work(AutoCli::Command &command, CommandLine const &line) {
+    std::chrono::microseconds const began = trace_.isEnabled() ? trace_.elapsed() : std::chrono::microseconds(0);
+    ProgressFunction const progress = context_.plugins.startProgress();
+    if (context_.activity != nullptr) {
+        // Traces and a line that is drawn over and over would be in each other's way; a conversation draws its own.
+        bool const mayShow = !trace_.isEnabled() && command.GetMetaDataField("interactive") != "true";
+        context_.activity->begin({progress, mayShow, report_.isMachine(), requestId_});
+    }
+    Outcome const outcome = call(command, line.input, context_.plugins); // never throws for what the command does
+    if (context_.activity != nullptr) {
+        context_.activity->end();
+    }
+    if (trace_.isEnabled()) {
+        Trace::Event(trace_, "command")
+            .number("status", static_cast<int64_t>(outcome.status))
+            .number("code", outcome.cause ? outcome.cause->code : 0)
+            .duration("tookMs", trace_.elapsed() - began);
+    }
+    return outcome;
 }
 
 FormatSettings Tool::formatSettings(AutoCli::Command &command,
@@ -236,18 +345,11 @@ void Tool::tell(Outcome const &outcome) {
         }
         return;
     }
-    std::string message = outcome.message;
-    if (daemonDead && !report_.isMachine()) {
-        // One line instead of message, cause and warning, which would say the same three times.
-        message = withoutLineEnd(message);
-        std::string const &sentence = outcome.cause->sentence;
-        if (!contains(message, sentence)) {
-            message += (message.ends_with('.') ? " " : ": ") + sentence;
-        }
-        message += contains(message, socketPath()) ? "" : " (" + socketPath() + ")";
-        message += startHint();
+    std::string hint = outcome.cause ? hintFor(outcome.cause->code, settings_.root, requestId_) : std::string();
+    if (daemonDead && !contains(outcome.message + outcome.cause->sentence, socketPath())) {
+        hint = "its socket is " + socketPath() + "; " + hint;
     }
-    report_.fail(message, outcome.cause);
+    report_.fail(outcome.message, outcome.cause, hint);
 }
 
 std::string Tool::socketPath() const {
@@ -255,7 +357,7 @@ std::string Tool::socketPath() const {
 }
 
 std::string Tool::startHint() const {
-    return "; start it with 'lumod --root " + settings_.root + "'";
+    return " (" + hintFor(static_cast<int32_t>(Wire::ErrorCode::DaemonNotRunning), settings_.root, requestId_) + ")";
 }
 
 std::string Tool::daemonSentence() const {

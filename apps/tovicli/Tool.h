@@ -9,12 +9,14 @@
 #include <string>
 #include <vector>
 
+#include "Activity.h"
 #include "Call.h"
 #include "CommandLine.h"
 #include "ErrorReport.h"
 #include "ExitStatus.h"
 #include "PluginSource.h"
 #include "Settings.h"
+#include "Trace.h"
 #include "plexa/FormatSettings.h"
 #include "plexa/Formatter.h"
 
@@ -32,6 +34,10 @@ struct Context {
     std::size_t width = 80;
     /// Runs with more rights than its caller has: what the caller put into the environment does not count.
     bool privileged = false;
+    /// Told when a command begins and ends; null: nobody watches.
+    Activity *activity = nullptr;
+    /// Time for traces; empty: the process's own.
+    Trace::Clock clock = {};
 };
 
 class Tool {
@@ -44,14 +50,21 @@ public:
 private:
     using Root = boost::shared_ptr<Plexa::AutoCli::Namespace>;
 
+    ExitStatus runReported(std::vector<std::string> const &arguments);
     ExitStatus runWords(std::vector<std::string> const &words);
     ExitStatus misread(Misread const &mistake);
     ExitStatus showHelp(Plexa::AutoCli::NamespaceNode &node);
     ExitStatus showVersion();
     ExitStatus runCommand(Plexa::AutoCli::Command &command, CommandLine const &line);
+    /// Calls the command, with whoever waits told that it is at work.
+    Outcome work(Plexa::AutoCli::Command &command, CommandLine const &line);
     void tell(Outcome const &outcome);
+    void traceParsed(CommandLine const &line);
+    void startTrace(std::optional<std::string> const &logLevel);
     ExitStatus written(ExitStatus status, std::string const &whatWasDone);
 
+    /// Whether errors are to be documents, as far as words that may not even be valid tell.
+    bool looksMachine(std::vector<std::string> const &words) const;
     /// Makes the settings hold: for the platform's libraries through the environment.
     void apply(Settings const &settings);
     /// A fresh tree with every plug-in's subtree under these settings.
@@ -65,6 +78,7 @@ private:
 
     Context &context_;
     ErrorReport report_;
+    Trace trace_;
     Settings settings_;
     Registration registration_;
     std::string requestId_;

@@ -4,9 +4,10 @@
 #include <cerrno>
 #include <climits>
 #include <csignal>
-#include <cstdio>
+#include <cstdlib>
 #include <fcntl.h>
 #include <string>
+#include <string_view>
 #include <sys/auxv.h>
 #include <sys/ioctl.h>
 #include <sys/random.h>
@@ -15,6 +16,7 @@
 
 #include "DescriptorSink.h"
 #include "PluginLoader.h"
+#include "ProcessActivity.h"
 #include "Tool.h"
 
 namespace {
@@ -32,23 +34,17 @@ void occupyStandardDescriptors() {
     }
 }
 
-extern "C" void endInterrupted(int) {
-    constexpr char text[] = "tovicli: interrupted\n";
-    ssize_t const written = write(STDERR_FILENO, text, sizeof(text) - 1);
-    static_cast<void>(written); // nobody is left to be told
-    _exit(static_cast<int>(Tovicli::ExitStatus::Interrupted));
-}
-
-void arrangeSignals() {
+/// A reader who has had enough makes a write fail, which is told as any other.
+void ignoreClosedPipes() {
     struct sigaction action {};
     action.sa_handler = SIG_IGN;
     sigaction(SIGPIPE, &action, nullptr);
-    struct sigaction before {};
-    sigaction(SIGINT, nullptr, &before);
-    if (before.sa_handler != SIG_IGN) { // a background job keeps ignoring it
-        action.sa_handler = endInterrupted;
-        sigaction(SIGINT, &action, nullptr);
-    }
+}
+
+/// A terminal whose cursor can be moved back over what was written.
+bool drawsLines(int descriptor) {
+    char const *const kind = getenv("TERM");
+    return isatty(descriptor) == 1 && kind != nullptr && *kind != '\0' && std::string_view(kind) != "dumb";
 }
 
 std::string directoryAbove(std::string const &path) {
@@ -92,7 +88,8 @@ std::size_t terminalWidth() {
 
 int main(int argc, char **argv) {
     occupyStandardDescriptors();
-    arrangeSignals();
+    ignoreClosedPipes();
+    Tovicli::ProcessActivity activity(drawsLines(STDERR_FILENO), isatty(STDOUT_FILENO) == 1);
     std::string const installed = directoryAbove(programDirectory());
     Tovicli::DescriptorSink output(STDOUT_FILENO);
     Tovicli::DescriptorSink errors(STDERR_FILENO);
@@ -101,6 +98,7 @@ int main(int argc, char **argv) {
     Tovicli::Context context{output,          errors,
                              environment,     plugins,
                              randomRequestId, {installed + "/lib/tovicli/plugins", workingDirectory()},
-                             terminalWidth(), getauxval(AT_SECURE) != 0};
+                             terminalWidth(), getauxval(AT_SECURE) != 0,
+                             &activity,       {}};
     return static_cast<int>(Tovicli::Tool(context).run(std::vector<std::string>(argv, argv + argc)));
 }

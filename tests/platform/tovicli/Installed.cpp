@@ -34,7 +34,7 @@ protected:
 TEST_F(Installed, FindsPluginsAndLibrariesBesideItself) {
     std::filesystem::copy(std::string(TEST_CLIENTS) + "/own/liblumo.so.1", place / "lib/liblumo.so.1");
     EXPECT_EQ(ask(), 1);
-    EXPECT_EQ(process.errors(), "tovicli: answered by own\ntovicli: cause: noted by own\n");
+    EXPECT_EQ(process.errors(), "tovicli: answered by own: noted by own\n");
 }
 
 TEST_F(Installed, APreloadedLibraryWins) {
@@ -43,7 +43,7 @@ TEST_F(Installed, APreloadedLibraryWins) {
         setenv("LD_PRELOAD", (std::string(TEST_CLIENTS) + "/substitute/liblumo.so.1").c_str(), 1);
     };
     EXPECT_EQ(ask(preload), 1);
-    EXPECT_EQ(process.errors(), "tovicli: answered by substitute\ntovicli: cause: noted by substitute\n");
+    EXPECT_EQ(process.errors(), "tovicli: answered by substitute: noted by substitute\n");
 }
 
 TEST_F(Installed, WithoutTheLibraryThePluginIsNamedAndTheCommandUnavailable) {

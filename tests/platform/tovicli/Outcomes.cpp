@@ -16,6 +16,8 @@ using Plexa::CallSpec::Input;
 using Plexa::CallSpec::Output;
 using Plexa::MetaObj::MetaBool;
 using Plexa::MetaObj::MetaString;
+using ::testing::EndsWith;
+using ::testing::StartsWith;
 using Tovicli::LastFailure;
 
 struct Case {
@@ -53,7 +55,7 @@ Case const cases[] = {
          output.Complete();
      },
      LastFailure{1, "the level 3 is none", "r"}, 1, "",
-     "tovicli: LumoLib_DebugCommand  failed with error the request is invalid\ntovicli: cause: the level 3 is none\n"},
+     "tovicli: LumoLib_DebugCommand  failed with error the request is invalid: the level 3 is none\n"},
     {"a message that holds its cause", [](Output &output) { output.SetMessage("Failed: no such array"); },
      LastFailure{22, "no such array", "r"}, 1, "", "tovicli: Failed: no such array\n"},
     {"a result with a message",
@@ -78,7 +80,7 @@ Case const cases[] = {
          output.Complete();
      },
      LastFailure{63, "the rule exists", "r"}, 1, "false\n",
-     "tovicli: the command reported failure\ntovicli: cause: the rule exists\n"},
+     "tovicli: the command reported failure: the rule exists ('faultInjection rule set' changes a rule)\n"},
     {"a failure that the command could do without",
      [](Output &output) {
          output.SetResult(MetaBool::New(true));
@@ -101,8 +103,8 @@ Case const cases[] = {
     {"a failed session, the daemon dead",
      [](Output &) { throw Kestrel::Lib::KestrelException("Unable to initialize lumoLib", "f", 1, {}); },
      LastFailure{10, "no daemon answers at /r/run/lumod.sock", "r"}, 3, "",
-     "tovicli: Unable to initialize lumoLib: no daemon answers at /r/run/lumod.sock; start it with 'lumod --root "
-     "/r'\n"},
+     "tovicli: Unable to initialize lumoLib: no daemon answers at /r/run/lumod.sock (start it with 'lumod --root "
+     "/r')\n"},
     {"any other exception", [](Output &) { throw std::runtime_error("what"); }, {}, 1, "", "tovicli: what\n"},
     {"no exception of the library's",
      [](Output &) { throw 7; },
@@ -111,16 +113,16 @@ Case const cases[] = {
      "",
      "tovicli: the command failed with an exception of an unknown kind\n"},
     {"the connection lost", [](Output &output) { output.SetMessage("m\n"); }, LastFailure{11, "cut", ""}, 3, "",
-     "tovicli: m\ntovicli: cause: cut\n"},
+     "tovicli: m: cut (see /r/log/lumod.log, request request-1)\n"},
     {"the deadline passed", [](Output &output) { output.SetMessage("m\n"); }, LastFailure{12, "late", ""}, 3, "",
-     "tovicli: m\ntovicli: cause: late\n"},
+     "tovicli: m: late (--timeout gives it more time)\n"},
     {"no session", [](Output &output) { output.SetMessage("m\n"); }, LastFailure{14, "none", ""}, 3, "",
-     "tovicli: m\ntovicli: cause: none\n"},
+     "tovicli: m: none\n"},
     {"a provider away", [](Output &output) { output.SetMessage("m\n"); }, LastFailure{30, "away", ""}, 1, "",
-     "tovicli: m\ntovicli: cause: away\n"},
+     "tovicli: m: away (see /r/log/lumod.log, request request-1)\n"},
     {"a host's exception for a dead daemon", [](Output &) { throw Gantry::Lib::GantryException("cannot mount", {}); },
      LastFailure{10, "no daemon answers at /r/run/lumod.sock", ""}, 3, "",
-     "tovicli: cannot mount: no daemon answers at /r/run/lumod.sock; start it with 'lumod --root /r'\n"},
+     "tovicli: cannot mount: no daemon answers at /r/run/lumod.sock (start it with 'lumod --root /r')\n"},
 };
 
 TEST(Outcomes, DecideStatusAndTexts) {
@@ -145,15 +147,15 @@ TEST(Outcomes, AFailureBeforeTheCallIsNotItsCause) {
 }
 
 TEST(Outcomes, RequestIdIsShownWhenMuchIsTold) {
-    for (std::string const level : {"verbose", "TRIVIA", "info"}) {
+    for (std::string const level : {"verbose", "info"}) {
         ToolHarness harness;
         harness.command->behaviour = [&](Input const &, Output &output) {
             harness.plugins.failure = LastFailure{22, "no such array", "request-1"};
             output.SetMessage("failed");
         };
         harness.run({"--log-level", level, "storage", "sample"});
-        std::string const id = level == "info" ? "" : " (request request-1)";
-        EXPECT_EQ(harness.errors, "tovicli: failed\ntovicli: cause: no such array" + id + "\n");
+        std::string const id = level == "info" ? "" : " [request request-1]";
+        EXPECT_EQ(harness.errors, "tovicli: failed: no such array" + id + "\n");
     }
 }
 
@@ -166,17 +168,68 @@ TEST(Outcomes, MachineFormatTellsErrorsAsADocument) {
     EXPECT_EQ(harness.run({"storage", "sample", "--format", "json"}), 1);
     EXPECT_EQ(harness.output, "");
     EXPECT_EQ(harness.errors, "{\"error\":{\"message\":\"failed \\\"here\\\"\",\"cause\":\"no such array\",\"code\":22,"
-                              "\"requestId\":\"request-1\"}}\n");
+                              "\"hint\":null,\"requestId\":\"request-1\",\"warnings\":[]}}\n");
     harness.command->behaviour = [](Input const &, Output &output) { output.SetMessage("alone"); };
     harness.run({"--format=json", "storage", "sample"});
-    EXPECT_EQ(harness.errors, "{\"error\":{\"message\":\"alone\",\"cause\":null,\"code\":null,\"requestId\":null}}\n");
+    EXPECT_EQ(harness.errors, "{\"error\":{\"message\":\"alone\",\"cause\":null,\"code\":null,\"hint\":null,"
+                              "\"requestId\":\"request-1\",\"warnings\":[]}}\n");
+}
+
+TEST(Outcomes, MachineFormatTellsMistakesAsADocumentToo) {
+    ToolHarness harness;
+    for (std::vector<std::string> const &words :
+         std::vector<std::vector<std::string>>{{"--format=json", "--bogus"},
+                                               {"--bogus", "--format", "json"},
+                                               {"--format", "json", "storage", "sample", "--bogus"},
+                                               {"--format", "json", "storage", "\xff\"\n"}}) {
+        EXPECT_EQ(harness.run(words), 2);
+        EXPECT_THAT(harness.errors, StartsWith("{\"error\":{\"message\":\""));
+        EXPECT_THAT(harness.errors, EndsWith(",\"warnings\":[]}}\n"));
+        EXPECT_EQ(harness.errors.find('\n'), harness.errors.size() - 1) << harness.errors;
+    }
+    harness.environment.values["TOVI_FORMAT"] = "json";
+    EXPECT_EQ(harness.run({"--bogus"}), 2);
+    EXPECT_THAT(harness.errors, StartsWith("{\"error\":"));
+}
+
+TEST(Outcomes, MachineFormatHasOneDocumentWithItsWarnings) {
+    ToolHarness harness;
+    harness.plugins.registration.troubles = {"plug-in 'a.so' failed: \"no\"\x1b\xff"};
+    harness.command->behaviour = [](Input const &, Output &output) { output.Complete(); };
+    EXPECT_EQ(harness.run({"--format=json", "storage", "sample"}), 0);
+    EXPECT_EQ(harness.errors, "{\"warnings\":[\"plug-in 'a.so' failed: \\\"no\\\"\\u001b\\\\xff\"]}\n");
+    harness.command->behaviour = [](Input const &, Output &output) { output.SetMessage("failed"); };
+    EXPECT_EQ(harness.run({"--format=json", "storage", "sample"}), 1);
+    EXPECT_THAT(harness.errors, StartsWith("{\"error\":{\"message\":\"failed\""));
+    EXPECT_THAT(harness.errors, EndsWith("\"warnings\":[\"plug-in 'a.so' failed: \\\"no\\\"\\u001b\\\\xff\"]}}\n"));
+}
+
+TEST(Outcomes, HintsNameWhatCanBeDone) {
+    struct Hinted {
+        int32_t code;
+        std::string hint;
+    };
+    for (Hinted const &each : {Hinted{10, "start it with 'lumod --root /r'"},
+                               {32, "'orkaprovider activate' makes a provider the array's active one"},
+                               {43, "it was left as it is; use the newer release that wrote it"},
+                               {45, ""},
+                               {9999, ""}}) {
+        ToolHarness harness;
+        harness.command->behaviour = [&](Input const &, Output &output) {
+            harness.plugins.failure = LastFailure{each.code, "why, at /r/run/lumod.sock", ""};
+            output.SetMessage("failed.\n\n");
+        };
+        harness.run({"--root=/r", "storage", "sample"});
+        std::string const hint = each.hint.empty() ? "" : " (" + each.hint + ")";
+        EXPECT_EQ(harness.errors, "tovicli: failed. why, at /r/run/lumod.sock" + hint + "\n");
+    }
 }
 
 TEST(Outcomes, fault_33_DaemonAbsentIsOneWarningOrOneLine) {
     ToolHarness harness;
     harness.plugins.registration.daemonMissing = true;
     harness.plugins.registration.daemonFailure = LastFailure{10, "no daemon answers at /r/run/lumod.sock: refused", ""};
-    std::string const hint = "; start it with 'lumod --root /r'\n";
+    std::string const hint = " (start it with 'lumod --root /r')\n";
     harness.command->behaviour = [](Input const &, Output &output) { output.Complete(); };
     EXPECT_EQ(harness.run({"--root=/r", "storage", "sample"}), 0);
     EXPECT_EQ(harness.errors, "tovicli: warning: no daemon answers at /r/run/lumod.sock: refused" + hint);
@@ -194,7 +247,7 @@ TEST(Outcomes, fault_33_DaemonAbsentIsOneWarningOrOneLine) {
     EXPECT_EQ(harness.run({"--root=/r", "storage"}), 0);
     EXPECT_EQ(harness.errors, "tovicli: warning: no daemon answers at /r/run/lumod.sock: refused" + hint);
     EXPECT_EQ(harness.run({"--root=/r", "storage", "sample", "--bogus"}), 2);
-    EXPECT_EQ(harness.errors, "tovicli: unknown option '--bogus'\ntovicli: try 'tovicli storage sample --help'\n");
+    EXPECT_EQ(harness.errors, "tovicli: unknown option '--bogus' (try 'tovicli storage sample --help')\n");
 }
 
 TEST(Outcomes, fault_33_WithoutTheCauseTheSocketIsNamedAllTheSame) {
@@ -203,7 +256,7 @@ TEST(Outcomes, fault_33_WithoutTheCauseTheSocketIsNamedAllTheSame) {
     harness.command->behaviour = [](Input const &, Output &output) { output.Complete(); };
     harness.run({"--root=/r", "storage", "sample"});
     EXPECT_EQ(harness.errors,
-              "tovicli: warning: no daemon answers at /r/run/lumod.sock; start it with 'lumod --root /r'\n");
+              "tovicli: warning: no daemon answers at /r/run/lumod.sock (start it with 'lumod --root /r')\n");
 }
 
 TEST(Outcomes, fault_63_OutputThatCannotBeWrittenIsToldWithWhatWasDone) {

@@ -27,10 +27,18 @@ public:
     void clearLastFailure() override {
         failure.reset();
     }
+    Tovicli::ProgressFunction startProgress() override {
+        return progress;
+    }
+    void traceRequests(std::function<void(Tovicli::RequestDone const &)> newReceiver) override {
+        receiver = std::move(newReceiver);
+    }
 
     std::function<void(Plexa::AutoCli::Namespace &root)> grow;
     Tovicli::Registration registration;
     std::optional<Tovicli::LastFailure> failure;
+    Tovicli::ProgressFunction progress = nullptr;
+    std::function<void(Tovicli::RequestDone const &)> receiver;
     std::vector<std::string> directories; ///< one each time that plug-ins were registered, and likewise:
     std::vector<std::string> roots;
 };
@@ -55,6 +63,8 @@ struct ToolHarness {
     TestPlugins plugins;
     Tovicli::MapEnvironment environment;
     bool privileged = false;
+    Tovicli::Activity *activity = nullptr;
+    Tovicli::Trace::Clock clock = {};
     std::string output;
     std::string errors;
 
@@ -79,8 +89,8 @@ struct ToolHarness {
     int runInto(Plexa::Sink &sink, std::vector<std::string> const &arguments) {
         Plexa::StringSink errorSink;
         Tovicli::Context context{
-            sink, errorSink, environment, plugins, [] { return std::string("request-1"); }, {"/plugins", "/cwd"},
-            80,   privileged};
+            sink, errorSink,  environment, plugins, [] { return std::string("request-1"); }, {"/plugins", "/cwd"},
+            80,   privileged, activity,    clock};
         auto const status = Tovicli::Tool(context).run(arguments);
         errors = errorSink.text();
         return static_cast<int>(status);

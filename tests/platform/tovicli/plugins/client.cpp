@@ -16,4 +16,5 @@ bool LumoPlatform_LastFailure(LumoLastFailure *out) {
 }
 
 void LumoPlatform_ClearLastFailure(void) {}
+// Counts nothing and traces nothing, as a platform of somebody else's may.
 }
