@@ -30,6 +30,8 @@ struct ProviderEntry {
     std::map<std::string, bool> activations;   ///< array id: activated or deactivated
     std::optional<std::string> toldContext;    ///< the Orka context that it was told last
     std::optional<kj::TimePoint> contextTried; ///< when telling was last tried without success
+    std::optional<kj::TimePoint> silentSince;  ///< it used up its time without an answer, and has given none since
+    bool isBeingTried = false;                 ///< somebody finds out when a silent one answers again
 
     bool isOffline() const {
         return injected == ProviderStatus::Offline;

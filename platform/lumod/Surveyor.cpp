@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Surveyor.h"
 
+#include <algorithm>
 #include <utility>
 
 #include <fmt/format.h>
@@ -16,6 +17,9 @@ namespace {
 /// does not keep us for ever.
 constexpr int attemptsForAgreement = 3;
 constexpr kj::Duration contextRetryPause = 60 * kj::SECONDS;
+/// How long a silent provider gets to answer when it is tried, and what lies between two trials.
+constexpr kj::Duration trialTime = 10 * kj::SECONDS;
+constexpr kj::Duration trialPause = 1 * kj::SECONDS;
 
 } // namespace
 
@@ -66,7 +70,8 @@ Answer<Survey> Surveyor::survey(CallPtr const &call) {
         CallPtr const inquiry = inquiryOf(call, asked.size());
         for (ProviderPtr const &provider : asked) {
             tellContext(provider, call);
-            answers.add(ask(provider, inquiry, attemptsForAgreement));
+            answers.add(asked.size() < 2 ? ask(provider, inquiry, attemptsForAgreement)
+                                         : askAmongOthers(provider, inquiry));
         }
         return kj::joinPromises(answers.finish())
             .then([this, call, asked = std::move(asked)](kj::Array<Outcome<Source>> &&sources) {
@@ -88,6 +93,60 @@ Answer<Source> Surveyor::ask(ProviderPtr const &provider, CallPtr const &call, i
                            return Outcome<Source>(Source{calls.provider(), std::move(arrays), std::move(containers)});
                        });
     });
+}
+
+Answer<Source> Surveyor::askAmongOthers(ProviderPtr const &provider, CallPtr const &inquiry) {
+    if (provider->silentSince) {
+        noteSilence(provider);
+        auto const seconds = (services_.timer.now() - *provider->silentSince) / kj::SECONDS;
+        return Outcome<Source>(
+            Failure(ErrorCode::ProviderUnreachable,
+                    fmt::format("the provider '{}' has been silent for {} s and is left out until it answers",
+                                provider->record.name, seconds)));
+    }
+    return ask(provider, inquiry, attemptsForAgreement).then([this, provider, inquiry](Outcome<Source> &&outcome) {
+        if (outcome.ok()) {
+            provider->silentSince = std::nullopt;
+        } else if (services_.timer.now() >= inquiry->deadline) {
+            noteSilence(provider);
+        }
+        return std::move(outcome);
+    });
+}
+
+void Surveyor::noteSilence(ProviderPtr const &provider) {
+    if (!provider->silentSince) {
+        provider->silentSince = services_.timer.now();
+    }
+    if (!provider->isBeingTried) {
+        provider->isBeingTried = true;
+        services_.tasks.add(
+            tryUntilAnswered(provider).attach(kj::defer([provider] { provider->isBeingTried = false; })));
+    }
+}
+
+kj::Promise<void> Surveyor::tryUntilAnswered(ProviderPtr provider) {
+    auto const deadline = services_.timer.now() + trialTime;
+    auto const trial = std::make_shared<Call const>(Call{"-", deadline, false});
+    return ask(provider, trial, 1).then([this, provider, deadline](Outcome<Source> &&outcome) -> kj::Promise<void> {
+        // A failure is an answer as well, unless it took all of the time.
+        if (outcome.ok() || services_.timer.now() < deadline) {
+            provider->silentSince = std::nullopt;
+        }
+        if (!provider->silentSince) {
+            services_.log.write(LogLevel::Info, "-",
+                                fmt::format("the provider '{}' answers again", provider->record.name));
+            return kj::READY_NOW;
+        }
+        return services_.timer.afterDelay(trialPause).then([this, provider]() -> kj::Promise<void> {
+            return isRegistered(provider) ? tryUntilAnswered(provider) : kj::READY_NOW;
+        });
+    });
+}
+
+bool Surveyor::isRegistered(ProviderPtr const &provider) const {
+    auto const &all = services_.providers.all();
+    return std::find(all.begin(), all.end(), provider) != all.end();
 }
 
 Survey Surveyor::assemble(std::vector<ProviderPtr> const &asked, kj::Array<Outcome<Source>> answers,

@@ -37,6 +37,9 @@ struct Survey {
 
 /// Asks every provider that is not offline for its arrays and containers, all at the same time, and puts the answers
 /// together. A provider that fails is left out, with a line in the log.
+///
+/// Among several providers a silent one costs the others half of one request's time. From then on it is left out at
+/// once, and asked apart from any request until it answers.
 class Surveyor {
 public:
     explicit Surveyor(Services &services)
@@ -50,6 +53,12 @@ private:
     /// the rest can still be done on the others.
     CallPtr inquiryOf(CallPtr const &call, std::size_t providers) const;
     Answer<Source> ask(ProviderPtr const &provider, CallPtr const &call, int attemptsLeft) const;
+    /// Asks one of several: notices that it is silent, and does not wait for it then.
+    Answer<Source> askAmongOthers(ProviderPtr const &provider, CallPtr const &inquiry);
+    void noteSilence(ProviderPtr const &provider);
+    /// Asks a silent provider until it answers, or until it is no longer registered.
+    kj::Promise<void> tryUntilAnswered(ProviderPtr provider);
+    bool isRegistered(ProviderPtr const &provider) const;
     Survey assemble(std::vector<ProviderPtr> const &asked, kj::Array<Outcome<Source>> answers, CallPtr const &call);
     std::shared_ptr<View const> viewOf(std::vector<Source> sources);
     void tellContext(ProviderPtr const &provider, CallPtr const &call);

@@ -12,10 +12,15 @@ load ../helper
     slow="${LUMO_ARRAY_URL#file://}"
     second=5ec00000-0000-4000-8000-000000000001
 
+    lumo daemon set --log-level trivia
     hold_lock "$slow"
+    asked="$(grep -c "queryStorageArray of provider 'lab'" "$TOVI_ROOT/log/lumod.log" || true)"
     TOVI_TIMEOUT_MS=60000 tovicli storage internal lumo configlumo add -n stuck -c "$container" \
         >"$BATS_TEST_TMPDIR/stuck" 2>&1 3>&- &
     stuck=$!
+    until [ "$(grep -c "queryStorageArray of provider 'lab'" "$TOVI_ROOT/log/lumod.log" || true)" -gt "$asked" ]; do
+        kill -0 "$stuck"
+    done
     # The ordered queue is held as soon as an ordered request to the free array is not answered within its deadline.
     while true; do
         TOVI_TIMEOUT_MS=500 lumo configlumo add -n ordered -c "$second"
@@ -27,7 +32,7 @@ load ../helper
 
     lumo daemon set --log-level info
     expect_done $'true\n'
-    # The daemon asks every provider where the container is, and waits for the silent one for half of the time.
+    # The daemon has noticed by now that one provider is silent, and asks the others where the container is.
     TOVI_TIMEOUT_MS=4000 lumo configlumo add -n ahead -c "$second" --priority
     expect_done $'true\n'
 
