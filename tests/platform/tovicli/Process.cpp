@@ -90,6 +90,14 @@ TEST_F(Process, InterruptEndsWith130) {
     EXPECT_EQ(errors(), "tovicli: interrupted; part of the work may have been done\n");
 }
 
+TEST_F(Process, InterruptInAMachineFormatIsADocument) {
+    EXPECT_EQ(run({"--format=json", "storage", "sample", "interrupt"}, [] { setenv("TOVI_REQUEST_ID", "r-1", 1); }),
+              130);
+    EXPECT_EQ(errors(), "{\"error\":{\"message\":\"interrupted; part of the work may have been done\",\"cause\":null,"
+                        "\"code\":null,\"hint\":null,\"requestId\":\"r-1\",\"warnings\":[]}}\n");
+    EXPECT_EQ(output(), "");
+}
+
 TEST_F(Process, InterruptThatWasIgnoredStaysIgnored) {
     EXPECT_EQ(run({"storage", "sample", "interrupt"}, [] { signal(SIGINT, SIG_IGN); }), 1);
     EXPECT_EQ(errors(), "tovicli: survived\n");

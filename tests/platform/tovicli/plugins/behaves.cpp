@@ -2,6 +2,7 @@
 //
 // Registers "storage sample" with commands that show what the process around them is like.
 #include <csignal>
+#include <cstdlib>
 #include <fcntl.h>
 #include <unistd.h>
 
@@ -46,6 +47,20 @@ public:
     }
 };
 
+/// Works until somebody writes into the pipe that TEST_PIPE names; answers whether that went undisturbed.
+class Wait : public virtual Plain {
+public:
+    void ExecuteInternal(boost::shared_ptr<CallSpec::Input> const &,
+                         boost::shared_ptr<CallSpec::Output> const &output) override {
+        int const pipe = open(getenv("TEST_PIPE"), O_RDONLY | O_CLOEXEC);
+        char byte = 0;
+        bool const read = ::read(pipe, &byte, 1) == 1;
+        close(pipe);
+        output->SetResult(MetaObj::MetaInt::New(read ? 7 : 0));
+        output->Complete();
+    }
+};
+
 /// Answers 42.
 class Answer : public virtual Plain {
 public:
@@ -63,4 +78,5 @@ void AutoCli_RegisterNamespaces(boost::shared_ptr<AutoCli::Namespace> &root) {
     sample->RegisterNamespaceNode(boost::make_shared<NextDescriptor>(), "descriptor");
     sample->RegisterNamespaceNode(boost::make_shared<Interrupt>(), "interrupt");
     sample->RegisterNamespaceNode(boost::make_shared<Answer>(), "answer");
+    sample->RegisterNamespaceNode(boost::make_shared<Wait>(), "wait");
 }
