@@ -16,8 +16,8 @@ constexpr std::size_t leastEntryBytes = 16;
 
 int32_t LumoLib_ActivateProvider(char const *arrayId, char const *vpName, char const *activeVpUrl, void *) {
     return answer([=](Connection &connection) {
-        connection.change([=](Wire::Request::Builder request) {
-            Wire::ActivateProvider::Builder activation = request.initActivateProvider();
+        connection.change([=](Compact::Request::Builder request) {
+            Compact::ActivateProvider::Builder activation = request.initActivateProvider();
             activation.setArrayId(argument(arrayId));
             activation.setProviderName(argument(vpName));
             activation.setActiveProviderUrl(argument(activeVpUrl));
@@ -27,8 +27,8 @@ int32_t LumoLib_ActivateProvider(char const *arrayId, char const *vpName, char c
 
 int32_t LumoLib_DeactivateProvider(char const *arrayId, char const *vpName) {
     return answer([=](Connection &connection) {
-        connection.change([=](Wire::Request::Builder request) {
-            Wire::DeactivateProvider::Builder deactivation = request.initDeactivateProvider();
+        connection.change([=](Compact::Request::Builder request) {
+            Compact::DeactivateProvider::Builder deactivation = request.initDeactivateProvider();
             deactivation.setArrayId(argument(arrayId));
             deactivation.setProviderName(argument(vpName));
         });
@@ -47,12 +47,12 @@ int32_t LumoLib_VendorProviderInjectFault(char const *vpName, char const *vpUrl,
             throw Wire::Failure(Wire::ErrorCode::MessageTooLarge,
                                 std::to_string(count) + " array entries do not fit into one request");
         }
-        connection.change([=](Wire::Request::Builder request) {
-            Wire::VendorProviderInjectFault::Builder injection = request.initVendorProviderInjectFault();
+        connection.change([=](Compact::Request::Builder request) {
+            Compact::VendorProviderInjectFault::Builder injection = request.initVendorProviderInjectFault();
             injection.setProviderName(argument(vpName));
             injection.setProviderUrl(argument(vpUrl));
             injection.setStatus(argument(status));
-            capnp::List<Wire::VendorProviderInjectFault::ArrayFault>::Builder arrays = injection.initArrays(size);
+            Compact::List<Compact::VendorProviderInjectFault::ArrayFault>::Builder arrays = injection.initArrays(size);
             for (unsigned place = 0; place < size; ++place) {
                 arrays[place].setArrayId(argument(entries[place].arrayId));
                 arrays[place].setIsActive(entries[place].isActive != 0);

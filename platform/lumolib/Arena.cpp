@@ -2,7 +2,6 @@
 #include "Arena.h"
 
 #include <algorithm>
-#include <cstring>
 
 namespace LumoClient {
 
@@ -31,15 +30,6 @@ void *Arena::allocateInNewBlock(std::size_t bytes, std::size_t alignment) {
     left_ = size - sizeof(Block);
     total_ += size;
     return allocate(bytes, alignment);
-}
-
-char const *Arena::copy(capnp::Text::Reader text) {
-    if (text.size() == 0) {
-        return "";
-    }
-    void *place = allocate(text.size() + 1, 1);
-    std::memcpy(place, text.cStr(), text.size() + 1);
-    return static_cast<char const *>(place);
 }
 
 } // namespace LumoClient

@@ -3,10 +3,10 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <new>
+#include <string_view>
 #include <type_traits>
-
-#include <capnp/blob.h>
 
 namespace LumoClient {
 
@@ -39,7 +39,15 @@ public:
     }
 
     /// A NUL-terminated copy.
-    char const *copy(capnp::Text::Reader text);
+    char const *copy(std::string_view text) {
+        if (text.empty()) {
+            return "";
+        }
+        char *const place = static_cast<char *>(allocate(text.size() + 1, 1));
+        std::memcpy(place, text.data(), text.size());
+        place[text.size()] = '\0';
+        return place;
+    }
 
 private:
     void *allocateInNewBlock(std::size_t bytes, std::size_t alignment);

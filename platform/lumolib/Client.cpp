@@ -17,28 +17,24 @@ namespace {
 constexpr std::size_t otherBytes = 4096;
 constexpr std::uint8_t highestAccessibility = 3;
 
-std::string stringOf(capnp::Text::Reader text) {
-    return std::string(text.begin(), text.size());
-}
-
-void fillTexts(capnp::List<capnp::Text>::Builder list, std::string const *texts) {
+void fillTexts(Compact::List<Compact::Text>::Builder list, std::string const *texts) {
     for (unsigned place = 0; place < list.size(); ++place) {
-        list.set(place, textOf(texts[place]));
+        list.set(place, texts[place]);
     }
 }
 
-void fillKey(Wire::VolumeKey::Builder builder, VolumeKey const &key) {
-    builder.setContainerId(textOf(key.containerId));
-    builder.setUuid(textOf(key.uuid));
-    builder.setDirectoryName(textOf(key.directoryName));
+void fillKey(Compact::VolumeKey::Builder builder, VolumeKey const &key) {
+    builder.setContainerId(key.containerId);
+    builder.setUuid(key.uuid);
+    builder.setDirectoryName(key.directoryName);
 }
 
-Container containerOf(Connection const &connection, Wire::StorageContainer::Reader answered,
+Container containerOf(Connection const &connection, Compact::StorageContainer::Reader answered,
                       std::vector<std::string> const &table) {
     Container container;
-    container.id = stringOf(answered.getId());
-    container.name = stringOf(answered.getName());
-    container.providerUrl = stringOf(answered.getProviderUrl());
+    container.id = answered.getId();
+    container.name = answered.getName();
+    container.providerUrl = answered.getProviderUrl();
     container.maxLumoSizeMb = answered.getMaxLumoSizeMb();
     for (std::uint32_t const place : answered.getArrays()) {
         if (place >= table.size()) {
@@ -51,16 +47,16 @@ Container containerOf(Connection const &connection, Wire::StorageContainer::Read
 }
 
 /// One reply on the way to a single container: arrays for the table, then the container.
-void takeContainer(Connection const &connection, Wire::Reply::Reader reply, std::vector<std::string> &table,
+void takeContainer(Connection const &connection, Compact::Reply::Reader reply, std::vector<std::string> &table,
                    std::optional<Container> &found) {
     if (reply.isStorageArrays()) {
-        capnp::List<Wire::StorageArray>::Reader const arrays = reply.getStorageArrays();
+        Compact::List<Compact::StorageArray>::Reader const arrays = reply.getStorageArrays();
         connection.requireChunk(arrays.size());
-        for (Wire::StorageArray::Reader const array : arrays) {
-            table.push_back(stringOf(array.getId()));
+        for (Compact::StorageArray::Reader const array : arrays) {
+            table.emplace_back(array.getId());
         }
     } else if (reply.isStorageContainers()) {
-        capnp::List<Wire::StorageContainer>::Reader const containers = reply.getStorageContainers();
+        Compact::List<Compact::StorageContainer>::Reader const containers = reply.getStorageContainers();
         if (containers.size() + (found ? 1 : 0) > 1) {
             throw connection.unexpected("it answered several containers of one id");
         }
@@ -75,14 +71,14 @@ void takeContainer(Connection const &connection, Wire::Reply::Reader reply, std:
 /// The answer of the four requests that change a volume.
 Volume changeVolume(Connection &connection, Connection::Fill fill) {
     Volume volume;
-    connection.request(Repeat::OnlyIfUnsent, connection.deadline(), kj::mv(fill), [&](Wire::Reply::Reader reply) {
+    connection.request(Repeat::OnlyIfUnsent, connection.deadline(), fill, [&](Compact::Reply::Reader reply) {
         if (!reply.isVolume()) {
             throw connection.unexpected("it answered something else than a volume");
         }
-        Wire::Volume::Reader const answered = reply.getVolume();
-        volume.uuid = stringOf(answered.getUuid());
-        volume.directoryName = stringOf(answered.getDirectoryName());
-        volume.endpoint = stringOf(answered.getEndpoint());
+        Compact::Volume::Reader const answered = reply.getVolume();
+        volume.uuid = answered.getUuid();
+        volume.directoryName = answered.getDirectoryName();
+        volume.endpoint = answered.getEndpoint();
     });
     return volume;
 }
@@ -92,7 +88,7 @@ std::size_t chunkLength(std::vector<std::string> const &ids, std::size_t first) 
     std::size_t bytes = otherBytes;
     std::size_t end = first;
     while (end < ids.size() && end - first < Wire::lumoIdsPerRequest) {
-        bytes += sizeof(capnp::word) * (2 + ids[end].size() / sizeof(capnp::word));
+        bytes += Compact::bytesPerWord * (2 + ids[end].size() / Compact::bytesPerWord);
         if (bytes > Wire::requestBytesMax && end > first) {
             break;
         }
@@ -116,16 +112,16 @@ Connection &Client::on(Channel channel) {
 DaemonStatus Client::ping() {
     DaemonStatus status;
     ordered_->request(
-        Repeat::Always, ordered_->deadline(), [](Wire::Request::Builder request) { request.setPing(); },
-        [&](Wire::Reply::Reader reply) {
+        Repeat::Always, ordered_->deadline(), [](Compact::Request::Builder request) { request.setPing(); },
+        [&](Compact::Reply::Reader reply) {
             if (!reply.isPong()) {
                 throw ordered_->unexpected("it answered something else than a pong");
             }
-            Wire::Pong::Reader const pong = reply.getPong();
-            status.version = stringOf(pong.getVersion());
+            Compact::Pong::Reader const pong = reply.getPong();
+            status.version = pong.getVersion();
             status.pid = pong.getPid();
             status.uptime = std::chrono::milliseconds(std::min<std::uint64_t>(pong.getUptimeMs(), INT64_MAX));
-            status.root = stringOf(pong.getRoot());
+            status.root = pong.getRoot();
         });
     return status;
 }
@@ -135,12 +131,12 @@ Container Client::findStorageContainer(std::string const &containerId, std::vect
     std::optional<Container> found;
     ordered_->request(
         Repeat::Always, ordered_->deadline(),
-        [&](Wire::Request::Builder request) {
-            Wire::FindStorageContainer::Builder query = request.initFindStorageContainer();
-            query.setContainerId(textOf(containerId));
+        [&](Compact::Request::Builder request) {
+            Compact::FindStorageContainer::Builder query = request.initFindStorageContainer();
+            query.setContainerId(containerId);
             fillTexts(query.initArrayIds(static_cast<unsigned>(arrayIds.size())), arrayIds.data());
         },
-        [&](Wire::Reply::Reader reply) { takeContainer(*ordered_, reply, table, found); });
+        [&](Compact::Reply::Reader reply) { takeContainer(*ordered_, reply, table, found); });
     if (!found) {
         throw Wire::Failure(Wire::ErrorCode::NoSuchContainer,
                             "no provider exports the storage container " + containerId);
@@ -149,29 +145,29 @@ Container Client::findStorageContainer(std::string const &containerId, std::vect
 }
 
 Volume Client::createVirtualVolume(NewVolume const &volume, Channel channel) {
-    return changeVolume(on(channel), [&](Wire::Request::Builder request) {
-        Wire::CreateVirtualVolume::Builder creation = request.initCreateVirtualVolume();
-        creation.setContainerId(textOf(volume.containerId));
-        creation.setDirectoryName(textOf(volume.directoryName));
-        creation.setPolicy(textOf(volume.policy));
+    return changeVolume(on(channel), [&](Compact::Request::Builder request) {
+        Compact::CreateVirtualVolume::Builder creation = request.initCreateVirtualVolume();
+        creation.setContainerId(volume.containerId);
+        creation.setDirectoryName(volume.directoryName);
+        creation.setPolicy(volume.policy);
         creation.setSizeMb(volume.sizeMb);
-        creation.setVmUuid(textOf(volume.vmUuid));
+        creation.setVmUuid(volume.vmUuid);
     });
 }
 
 Volume Client::bindVirtualVolume(VolumeKey const &key, Channel channel) {
     return changeVolume(on(channel),
-                        [&](Wire::Request::Builder request) { fillKey(request.initBindVirtualVolume(), key); });
+                        [&](Compact::Request::Builder request) { fillKey(request.initBindVirtualVolume(), key); });
 }
 
 Volume Client::unbindVirtualVolume(VolumeKey const &key, Channel channel) {
     return changeVolume(on(channel),
-                        [&](Wire::Request::Builder request) { fillKey(request.initUnbindVirtualVolume(), key); });
+                        [&](Compact::Request::Builder request) { fillKey(request.initUnbindVirtualVolume(), key); });
 }
 
 Volume Client::deleteVirtualVolume(VolumeKey const &key, Channel channel) {
     return changeVolume(on(channel),
-                        [&](Wire::Request::Builder request) { fillKey(request.initDeleteVirtualVolume(), key); });
+                        [&](Compact::Request::Builder request) { fillKey(request.initDeleteVirtualVolume(), key); });
 }
 
 std::vector<std::uint8_t> Client::checkLumoAccessibility(std::string const &containerId,
@@ -183,20 +179,20 @@ std::vector<std::uint8_t> Client::checkLumoAccessibility(std::string const &cont
         std::size_t const count = chunkLength(lumoIds, first);
         ordered_->request(
             Repeat::Always, deadline,
-            [&](Wire::Request::Builder request) {
-                Wire::CheckLumoAccessibility::Builder check = request.initCheckLumoAccessibility();
-                check.setContainerId(textOf(containerId));
+            [&](Compact::Request::Builder request) {
+                Compact::CheckLumoAccessibility::Builder check = request.initCheckLumoAccessibility();
+                check.setContainerId(containerId);
                 fillTexts(check.initLumoIds(static_cast<unsigned>(count)), &lumoIds[first]);
             },
-            [&](Wire::Reply::Reader reply) {
+            [&](Compact::Reply::Reader reply) {
                 if (!reply.isAccessibility()) {
                     throw ordered_->unexpected("it answered something else than accessibilities");
                 }
-                capnp::Data::Reader const values = reply.getAccessibility();
+                std::span<std::uint8_t const> const values = reply.getAccessibility();
                 if (values.size() > first + count - result.size()) {
                     throw ordered_->unexpected("it answered the accessibility of more volumes than were asked about");
                 }
-                for (kj::byte const value : values) {
+                for (std::uint8_t const value : values) {
                     if (value > highestAccessibility) {
                         throw ordered_->unexpected("it answered the accessibility " + std::to_string(value));
                     }
@@ -218,22 +214,22 @@ std::vector<std::string> Client::protocolEndpointEvent(std::string const &endpoi
     std::vector<std::string> names;
     ordered_->request(
         Repeat::Always, ordered_->deadline(),
-        [&](Wire::Request::Builder request) {
-            Wire::ProtocolEndpointEvent::Builder event = request.initProtocolEndpointEvent();
-            event.setEndpoint(textOf(endpoint));
+        [&](Compact::Request::Builder request) {
+            Compact::ProtocolEndpointEvent::Builder event = request.initProtocolEndpointEvent();
+            event.setEndpoint(endpoint);
             event.setApd(apd);
         },
-        [&](Wire::Reply::Reader reply) {
+        [&](Compact::Reply::Reader reply) {
             if (reply.isDone()) {
                 return;
             }
             if (!reply.isContainerNames()) {
                 throw ordered_->unexpected("it answered something else than container names");
             }
-            capnp::List<capnp::Text>::Reader const answered = reply.getContainerNames();
+            Compact::List<Compact::Text>::Reader const answered = reply.getContainerNames();
             ordered_->requireChunk(answered.size());
-            for (capnp::Text::Reader const name : answered) {
-                names.push_back(stringOf(name));
+            for (std::string_view const name : answered) {
+                names.emplace_back(name);
             }
         });
     return names;

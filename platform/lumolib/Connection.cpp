@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <new>
 #include <utility>
 
 #include <sys/socket.h>
@@ -21,8 +20,6 @@ using Wire::Failure;
 
 namespace {
 
-/// Nearly every request fits; a larger one grows on the heap.
-constexpr std::size_t scratchWords = 128;
 /// A buffer that grew for a long answer is given back after it.
 constexpr std::size_t keptBufferBytes = std::size_t{64} << 10;
 
@@ -61,11 +58,11 @@ Failure connectFailure(int error, std::string const &path, std::chrono::millisec
 }
 
 /// What the daemon answered instead of a result. Its sentence is for the user as it stands.
-Failure answered(Wire::FailureReply::Reader failure) {
-    capnp::Text::Reader const sentence = failure.getSentence();
+Failure answered(Compact::FailureReply::Reader failure) {
+    std::string_view const sentence = failure.getSentence();
     char const *general = Wire::textOf(failure.getCode());
     if (sentence.size() > 0) {
-        return Failure(static_cast<ErrorCode>(failure.getCode()), std::string(sentence.cStr(), sentence.size()));
+        return Failure(static_cast<ErrorCode>(failure.getCode()), std::string(sentence));
     }
     return Failure(static_cast<ErrorCode>(failure.getCode()), general != nullptr ? general : "unknown error");
 }
@@ -86,21 +83,22 @@ Failure Connection::unexpected(std::string const &what) const {
     return Failure(ErrorCode::ProtocolError, "the daemon at " + socketPath_ + " broke the protocol: " + what);
 }
 
-/// Framing does not know who its peer is; this says it.
-Failure Connection::explained(Failure const &failure) const {
+/// Framing does not know who its peer is; this says it, and what becomes of a change that nobody answered for.
+Failure Connection::explained(Failure const &failure, bool changeIsSent) const {
     std::string const daemon = "the daemon at " + socketPath_;
     switch (failure.code()) {
     case ErrorCode::DeadlineExceeded:
-        return Failure(failure.code(), daemon + " gave no answer within " + std::to_string(timeout_.count()) + " ms");
+        return Failure(failure.code(), daemon + " gave no answer within " + std::to_string(timeout_.count()) + " ms" +
+                                           (changeIsSent ? "; the change may still be carried out" : ""));
     case ErrorCode::ConnectionLost:
-        return Failure(failure.code(), daemon + " closed the connection before it answered");
+        return Failure(failure.code(), daemon + " closed the connection before it answered" +
+                                           (changeIsSent ? "; the change may have been carried out" : ""));
     default:
         return Failure(failure.code(), daemon + " broke the protocol: " + failure.sentence());
     }
 }
 
 void Connection::close() {
-    reader_.reset();
     socket_.reset();
 }
 
@@ -140,31 +138,26 @@ void Connection::connect(Wire::Deadline deadline) {
 }
 
 void Connection::request(Repeat repeat, Wire::Deadline deadline, Fill fill, Take take) {
-    capnp::word scratch[scratchWords] = {};
-    reader_.reset();
     traffic_ = Traffic();
     RequestTrace trace(socketPath_, requestId_, traffic_);
     try {
-        capnp::MallocMessageBuilder message(kj::arrayPtr(scratch, scratchWords));
-        Wire::Request::Builder request = message.initRoot<Wire::Request>();
-        request.setVersion(Wire::PROTOCOL_VERSION);
+        Compact::MessageBuilder message;
+        Compact::Request::Builder request = message.initRoot<Compact::Request>();
+        request.setVersion(Compact::PROTOCOL_VERSION);
         request.setId(++lastId_);
         request.setDeadlineMs(static_cast<std::uint32_t>(remainder(deadline).count()));
-        request.setTraceId(textOf(requestId_));
+        request.setTraceId(requestId_);
         fill(request);
         traffic_.method = static_cast<std::uint16_t>(request.which());
         answerComplete_ = true; // until a request is on its way
-        Wire::Reply::Reader reply = ask(message, repeat, deadline);
+        Compact::Reply::Reader reply = ask(message, repeat, deadline);
         take(reply);
         while (!answerComplete_) {
-            reply = nextReply(deadline);
+            reply = nextReply(repeat, deadline);
             take(reply);
         }
-    } catch (kj::Exception const &exception) {
+    } catch (Compact::Malformed const &) {
         close();
-        if (exception.getType() == kj::Exception::Type::OVERLOADED) {
-            throw std::bad_alloc();
-        }
         trace.failed(ErrorCode::ProtocolError);
         throw unexpected("its reply is malformed");
     } catch (Failure const &failure) {
@@ -179,14 +172,13 @@ void Connection::request(Repeat repeat, Wire::Deadline deadline, Fill fill, Take
         }
         throw;
     }
-    reader_.reset();
-    if (buffer_.capacityBytes() > keptBufferBytes) {
-        buffer_.release();
+    if (received_.capacityBytes() > keptBufferBytes) {
+        received_.release();
     }
 }
 
 void Connection::change(Fill fill) {
-    request(Repeat::OnlyIfUnsent, deadline(), kj::mv(fill), [this](Wire::Reply::Reader reply) {
+    request(Repeat::OnlyIfUnsent, deadline(), fill, [this](Compact::Reply::Reader reply) {
         if (!reply.isDone()) {
             throw unexpected("it answered something else than that it is done");
         }
@@ -199,27 +191,27 @@ void Connection::requireChunk(std::size_t elements) const {
     }
 }
 
-Wire::Reply::Reader Connection::ask(capnp::MessageBuilder &message, Repeat repeat, Wire::Deadline deadline) {
+Compact::Reply::Reader Connection::ask(Compact::MessageBuilder const &message, Repeat repeat, Wire::Deadline deadline) {
     bool const wasConnected = static_cast<bool>(socket_);
     std::size_t sentBytes = 0;
     try {
-        return askOnce(message, deadline, sentBytes);
+        return askOnce(message, repeat, deadline, sentBytes);
     } catch (Failure const &failure) {
         bool const mayRepeat = repeat == Repeat::Always || sentBytes == 0;
         if (!wasConnected || failure.code() != ErrorCode::ConnectionLost || !mayRepeat) {
             throw;
         }
     }
-    return askOnce(message, deadline, sentBytes);
+    return askOnce(message, repeat, deadline, sentBytes);
 }
 
-Wire::Reply::Reader Connection::askOnce(capnp::MessageBuilder &message, Wire::Deadline deadline,
-                                        std::size_t &sentBytes) {
+Compact::Reply::Reader Connection::askOnce(Compact::MessageBuilder const &message, Repeat repeat,
+                                           Wire::Deadline deadline, std::size_t &sentBytes) {
     connect(deadline);
     answerBytes_ = 0;
     answerComplete_ = false;
     try {
-        Wire::send(socket_.get(), message, Wire::requestBytesMax, deadline, &sentBytes);
+        Compact::send(socket_.get(), message, Wire::requestBytesMax, deadline, &sentBytes);
         traffic_.sentBytes = sentBytes;
     } catch (Failure const &failure) {
         if (failure.code() == ErrorCode::MessageTooLarge) {
@@ -227,44 +219,41 @@ Wire::Reply::Reader Connection::askOnce(capnp::MessageBuilder &message, Wire::De
             throw Failure(failure.code(), "the request is too large: " + failure.sentence());
         }
         std::optional<Failure> const reason = partingWords(deadline);
-        throw reason ? *reason : explained(failure);
+        throw reason ? *reason : explained(failure, false); // half a request is not carried out
     }
-    return nextReply(deadline);
+    return nextReply(repeat, deadline);
 }
 
 /// A daemon that closed the connection before it read anything may have said why.
 std::optional<Failure> Connection::partingWords(Wire::Deadline deadline) {
     try {
-        if (Wire::receive(socket_.get(), buffer_, Wire::replyBytesMax, deadline)) {
-            capnp::SegmentArrayMessageReader reader(buffer_.segments(), Wire::readerOptions(buffer_.bodyBytes()));
-            Wire::Reply::Reader const reply = reader.getRoot<Wire::Reply>();
+        if (Compact::receive(socket_.get(), received_, Wire::replyBytesMax, deadline)) {
+            Compact::Reply::Reader const reply = received_.getRoot<Compact::Reply>();
             if (reply.isFailure() && reply.getId() == 0) {
                 return answered(reply.getFailure());
             }
         }
     } catch (Failure const &) { // nothing was said, then
-    } catch (kj::Exception const &) {
+    } catch (Compact::Malformed const &) {
     }
     return std::nullopt;
 }
 
-Wire::Reply::Reader Connection::nextReply(Wire::Deadline deadline) {
-    reader_.reset();
+Compact::Reply::Reader Connection::nextReply(Repeat repeat, Wire::Deadline deadline) {
     try {
-        if (!Wire::receive(socket_.get(), buffer_, Wire::replyBytesMax, deadline)) {
+        if (!Compact::receive(socket_.get(), received_, Wire::replyBytesMax, deadline)) {
             throw Failure(ErrorCode::ConnectionLost, "the peer closed the connection");
         }
     } catch (Failure const &failure) {
-        throw explained(failure);
+        throw explained(failure, repeat == Repeat::OnlyIfUnsent);
     }
-    answerBytes_ += buffer_.bodyBytes();
+    answerBytes_ += received_.bodyBytes();
     traffic_.receivedBytes = answerBytes_;
     ++traffic_.replies;
     if (answerBytes_ > Wire::answerBytesMax) {
         throw unexpected("its answer is larger than " + std::to_string(Wire::answerBytesMax) + " bytes");
     }
-    reader_.emplace(buffer_.segments(), Wire::readerOptions(buffer_.bodyBytes()));
-    Wire::Reply::Reader const reply = reader_->getRoot<Wire::Reply>();
+    Compact::Reply::Reader const reply = received_.getRoot<Compact::Reply>();
     bool const mine = reply.getId() == lastId_;
     if (reply.isFailure() && (mine || reply.getId() == 0)) {
         if (reply.getFailure().getCode() == 0) {

@@ -8,17 +8,17 @@
 #include <optional>
 #include <string>
 
-#include <capnp/message.h>
-#include <capnp/serialize.h>
-#include <kj/function.h>
-
+#include "FunctionRef.h"
 #include "RequestTrace.h"
 #include "lumolib/Client.h"
-#include "wire/Framing.h"
 #include "wire/UniqueFd.h"
-#include "wire/lumod.capnp.h"
+#include "wire/compact/Framing.h"
+#include "wire/lumod.compact.h"
 
 namespace LumoClient {
+
+/// The messages, as a client reads and writes them.
+namespace Compact = Wire::Compact;
 
 /// What may be done about a connection that turns out to be lost: a request that only reads may always be asked again,
 /// one that changes something only when the daemon cannot have seen any of it.
@@ -26,8 +26,8 @@ enum class Repeat { Always, OnlyIfUnsent };
 
 class Connection {
 public:
-    using Fill = kj::FunctionParam<void(Wire::Request::Builder)>;
-    using Take = kj::FunctionParam<void(Wire::Reply::Reader)>;
+    using Fill = FunctionRef<void(Compact::Request::Builder)>;
+    using Take = FunctionRef<void(Compact::Reply::Reader)>;
 
     Connection(std::string socketPath, Settings const &settings);
 
@@ -54,13 +54,14 @@ public:
     Wire::Failure unexpected(std::string const &what) const;
 
 private:
-    Wire::Reply::Reader ask(capnp::MessageBuilder &message, Repeat repeat, Wire::Deadline deadline);
-    Wire::Reply::Reader askOnce(capnp::MessageBuilder &message, Wire::Deadline deadline, std::size_t &sentBytes);
-    Wire::Reply::Reader nextReply(Wire::Deadline deadline);
+    Compact::Reply::Reader ask(Compact::MessageBuilder const &message, Repeat repeat, Wire::Deadline deadline);
+    Compact::Reply::Reader askOnce(Compact::MessageBuilder const &message, Repeat repeat, Wire::Deadline deadline,
+                                   std::size_t &sentBytes);
+    Compact::Reply::Reader nextReply(Repeat repeat, Wire::Deadline deadline);
     std::optional<Wire::Failure> partingWords(Wire::Deadline deadline);
     bool peerIsSilent() const;
     void close();
-    Wire::Failure explained(Wire::Failure const &failure) const;
+    Wire::Failure explained(Wire::Failure const &failure, bool changeIsSent) const;
 
     std::string const socketPath_;
     std::chrono::milliseconds const timeout_;
@@ -71,13 +72,7 @@ private:
     std::uint64_t answerBytes_ = 0;
     Traffic traffic_;
     bool answerComplete_ = true;
-    Wire::MessageBuffer buffer_;
-    std::optional<capnp::SegmentArrayMessageReader> reader_;
+    Compact::ReceivedMessage received_;
 };
-
-/// A text for a message. No copy; the text has to outlive the call that sets it.
-inline capnp::Text::Reader textOf(std::string const &text) {
-    return capnp::Text::Reader(text.c_str(), text.size());
-}
 
 } // namespace LumoClient

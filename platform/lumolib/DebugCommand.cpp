@@ -21,8 +21,8 @@ int32_t LumoLib_DebugCommand(int32_t const *logLevel, int32_t const *dump, int32
         std::int64_t const level = setting(logLevel, "the log level");
         std::int64_t const dumping = setting(dump, "the dump request");
         std::int64_t const period = setting(unbindPeriodUs, "the unbind period");
-        connection.change([=](Wire::Request::Builder request) {
-            Wire::DebugCommand::Builder command = request.initDebugCommand();
+        connection.change([=](Compact::Request::Builder request) {
+            Compact::DebugCommand::Builder command = request.initDebugCommand();
             command.setLogLevel(level);
             command.setDump(dumping);
             command.setUnbindPeriodUs(period);
@@ -33,6 +33,6 @@ int32_t LumoLib_DebugCommand(int32_t const *logLevel, int32_t const *dump, int32
 int32_t LumoLib_SetSPMSpaceEfficiencyManipulationEnabled(uint8_t enabled) {
     return answer([=](Connection &connection) {
         connection.change(
-            [=](Wire::Request::Builder request) { request.setSetSpaceEfficiencyManipulationEnabled(enabled != 0); });
+            [=](Compact::Request::Builder request) { request.setSetSpaceEfficiencyManipulationEnabled(enabled != 0); });
     });
 }

@@ -5,8 +5,8 @@ using namespace LumoClient;
 
 namespace {
 
-void fillRule(Wire::FaultInjectionRule::Builder rule, char const *fault, char const *operation, std::int32_t frequency,
-              std::int32_t timeMs) {
+void fillRule(Compact::FaultInjectionRule::Builder rule, char const *fault, char const *operation,
+              std::int32_t frequency, std::int32_t timeMs) {
     rule.setFault(argument(fault));
     rule.setOperation(argument(operation));
     rule.setFrequency(frequency);
@@ -17,13 +17,14 @@ void fillRule(Wire::FaultInjectionRule::Builder rule, char const *fault, char co
 
 bool LumoLib_SetFaultInjectionEnabled(bool enabled) {
     return answer([=](Connection &connection) {
-               connection.change([=](Wire::Request::Builder request) { request.setSetFaultInjectionEnabled(enabled); });
+               connection.change(
+                   [=](Compact::Request::Builder request) { request.setSetFaultInjectionEnabled(enabled); });
            }) == 0;
 }
 
 bool LumoLib_AddFaultInjectionRule(char const *fault, char const *operation, int32_t frequency, int32_t timeMs) {
     return answer([=](Connection &connection) {
-               connection.change([=](Wire::Request::Builder request) {
+               connection.change([=](Compact::Request::Builder request) {
                    fillRule(request.initAddFaultInjectionRule(), fault, operation, frequency, timeMs);
                });
            }) == 0;
@@ -31,7 +32,7 @@ bool LumoLib_AddFaultInjectionRule(char const *fault, char const *operation, int
 
 bool LumoLib_ModifyFaultInjectionRule(char const *fault, char const *operation, int32_t frequency, int32_t timeMs) {
     return answer([=](Connection &connection) {
-               connection.change([=](Wire::Request::Builder request) {
+               connection.change([=](Compact::Request::Builder request) {
                    fillRule(request.initModifyFaultInjectionRule(), fault, operation, frequency, timeMs);
                });
            }) == 0;

@@ -14,8 +14,8 @@ LumoErrorEx LumoLib_GetStorageContainer(int32_t, void const *, StorageContainerR
         StorageRecords records(owned->arena, connection);
         connection.request(
             Repeat::Always, connection.deadline(),
-            [](Wire::Request::Builder request) { request.setGetStorageContainer(); },
-            [&records](Wire::Reply::Reader reply) { records.take(reply); });
+            [](Compact::Request::Builder request) { request.setGetStorageContainer(); },
+            [&records](Compact::Reply::Reader reply) { records.take(reply); });
         records.finish(*owned);
         LumoPlatform_NoteProgress(0, owned->containerCount);
         *result = owned.release();

@@ -19,12 +19,12 @@ void inspect(Connection &connection, char const *containerId, char const *uuid, 
     std::string const canonical = canonicalContainerId(containerId);
     connection.request(
         Repeat::Always, connection.deadline(),
-        [&](Wire::Request::Builder request) {
-            Wire::VolumeKey::Builder key = init(request);
-            key.setContainerId(textOf(canonical));
+        [&](Compact::Request::Builder request) {
+            Compact::VolumeKey::Builder key = init(request);
+            key.setContainerId(canonical);
             key.setUuid(argument(uuid));
         },
-        [&](Wire::Reply::Reader reply) { take(reply); });
+        [&](Compact::Reply::Reader reply) { take(reply); });
 }
 
 void requireKind(Connection const &connection, bool right, char const *kind) {
@@ -47,10 +47,10 @@ int32_t LumoLib_SpaceStatsForLumo(char const *containerId, char const *uuid, Lum
         auto owned = std::make_unique<LumoSpaceStats>();
         inspect(
             connection, containerId, uuid,
-            [](Wire::Request::Builder request) { return request.initSpaceStatsForLumo(); },
-            [&](Wire::Reply::Reader reply) {
+            [](Compact::Request::Builder request) { return request.initSpaceStatsForLumo(); },
+            [&](Compact::Reply::Reader reply) {
                 requireKind(connection, reply.isSpaceStats(), "space statistics");
-                Wire::SpaceStats::Reader const answered = reply.getSpaceStats();
+                Compact::SpaceStats::Reader const answered = reply.getSpaceStats();
                 owned->logicalSize = answered.getLogicalSizeMb();
                 owned->committedSize = answered.getCommittedSizeMb();
                 owned->unsharedSize = answered.getUnsharedSizeMb();
@@ -74,10 +74,10 @@ int32_t LumoLib_GetLumoInfo(char const *containerId, char const *uuid, LumoInfo 
         requireOut(info);
         auto owned = std::make_unique<Owned<LumoInfo>>();
         inspect(
-            connection, containerId, uuid, [](Wire::Request::Builder request) { return request.initGetLumoInfo(); },
-            [&](Wire::Reply::Reader reply) {
+            connection, containerId, uuid, [](Compact::Request::Builder request) { return request.initGetLumoInfo(); },
+            [&](Compact::Reply::Reader reply) {
                 requireKind(connection, reply.isLumoInfo(), "volume information");
-                Wire::LumoInfo::Reader const answered = reply.getLumoInfo();
+                Compact::LumoInfo::Reader const answered = reply.getLumoInfo();
                 if (answered.hasStorageProfile()) {
                     owned->storageProfile = owned->arena.copy(answered.getStorageProfile());
                 }
@@ -98,11 +98,11 @@ int32_t LumoLib_UnsharedChunksLumo(char const *containerId, char const *uuid, in
         std::unique_ptr<LumoUnsharedChunks, decltype(&std::free)> block(nullptr, &std::free);
         inspect(
             connection, containerId, uuid,
-            [](Wire::Request::Builder request) { return request.initUnsharedChunksLumo(); },
-            [&](Wire::Reply::Reader reply) {
+            [](Compact::Request::Builder request) { return request.initUnsharedChunksLumo(); },
+            [&](Compact::Reply::Reader reply) {
                 requireKind(connection, reply.isUnsharedChunks(), "unshared chunks");
-                Wire::UnsharedChunks::Reader const answered = reply.getUnsharedChunks();
-                capnp::Data::Reader const bitmap = answered.getBitmap();
+                Compact::UnsharedChunks::Reader const answered = reply.getUnsharedChunks();
+                std::span<std::uint8_t const> const bitmap = answered.getBitmap();
                 void *room = std::malloc(sizeof(LumoUnsharedChunks) + bitmap.size());
                 if (room == nullptr) {
                     throw std::bad_alloc();
@@ -110,7 +110,7 @@ int32_t LumoLib_UnsharedChunksLumo(char const *containerId, char const *uuid, in
                 block.reset(new (room) LumoUnsharedChunks{answered.getBlockSize(),
                                                           static_cast<std::int64_t>(bitmap.size()) * 8});
                 if (bitmap.size() > 0) {
-                    std::memcpy(block.get() + 1, bitmap.begin(), bitmap.size());
+                    std::memcpy(block.get() + 1, bitmap.data(), bitmap.size());
                 }
             });
         requireNotNegative(connection, block->blockSize, "the block size");
@@ -124,15 +124,16 @@ int32_t LumoLib_GetLumoMetadata(char const *containerId, char const *uuid, LumoM
         auto owned = std::make_unique<Owned<LumoMetadata>>();
         LumoMetadataEntry **end = &owned->first;
         inspect(
-            connection, containerId, uuid, [](Wire::Request::Builder request) { return request.initGetLumoMetadata(); },
-            [&](Wire::Reply::Reader reply) {
+            connection, containerId, uuid,
+            [](Compact::Request::Builder request) { return request.initGetLumoMetadata(); },
+            [&](Compact::Reply::Reader reply) {
                 requireKind(connection, reply.isMetadata() || reply.isDone(), "metadata");
                 if (reply.isDone()) {
                     return;
                 }
-                capnp::List<Wire::MetadataPair>::Reader const pairs = reply.getMetadata();
+                Compact::List<Compact::MetadataPair>::Reader const pairs = reply.getMetadata();
                 connection.requireChunk(pairs.size());
-                for (Wire::MetadataPair::Reader const pair : pairs) {
+                for (Compact::MetadataPair::Reader const pair : pairs) {
                     LumoMetadataEntry *entry = owned->arena.records<LumoMetadataEntry>(1);
                     entry->key = owned->arena.copy(pair.getKey());
                     entry->value = owned->arena.copy(pair.getValue());

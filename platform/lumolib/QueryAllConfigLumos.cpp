@@ -42,21 +42,21 @@ int32_t LumoLib_QueryAllConfigLumos(char const *containerId, int32_t max, int32_
         auto const limit = static_cast<std::size_t>(std::max(max, 0));
         connection.request(
             Repeat::Always, connection.deadline(),
-            [&](Wire::Request::Builder request) {
-                Wire::QueryAllConfigLumos::Builder query = request.initQueryAllConfigLumos();
-                query.setContainerId(textOf(canonical));
+            [&](Compact::Request::Builder request) {
+                Compact::QueryAllConfigLumos::Builder query = request.initQueryAllConfigLumos();
+                query.setContainerId(canonical);
                 query.setMax(std::max(max, 0));
             },
-            [&](Wire::Reply::Reader reply) {
+            [&](Compact::Reply::Reader reply) {
                 if (reply.isDone()) {
                     return;
                 }
                 if (!reply.isConfigLumos()) {
                     throw connection.unexpected("it answered something else than config volumes");
                 }
-                capnp::List<Wire::ConfigLumo>::Reader const lumos = reply.getConfigLumos();
+                Compact::List<Compact::ConfigLumo>::Reader const lumos = reply.getConfigLumos();
                 connection.requireChunk(lumos.size());
-                for (Wire::ConfigLumo::Reader const lumo : lumos) {
+                for (Compact::ConfigLumo::Reader const lumo : lumos) {
                     if (entries.size() == limit) {
                         break; // a daemon that tells more than it was asked for
                     }

@@ -25,7 +25,7 @@ std::int32_t noted(Wire::ErrorCode code, char const *sentence) noexcept {
 }
 
 /// The one place where exceptions end.
-std::int32_t attempt(kj::FunctionParam<void()> work) noexcept {
+std::int32_t attempt(FunctionRef<void()> work) noexcept {
     try {
         work();
         return 0;
@@ -67,13 +67,13 @@ void open() {
 
 } // namespace
 
-std::int32_t answer(kj::FunctionParam<void(Connection &)> work) noexcept {
+std::int32_t answer(FunctionRef<void(Connection &)> work) noexcept {
     return attempt([&work] { work(openSession()); });
 }
 
-LumoErrorEx answerEx(kj::FunctionParam<void(Connection &)> work) noexcept {
+LumoErrorEx answerEx(FunctionRef<void(Connection &)> work) noexcept {
     LumoErrorEx error{};
-    error.code = answer(kj::mv(work));
+    error.code = answer(work);
     LumoLastFailure failure{};
     if (error.code != 0 && LumoPlatform_LastFailure(&failure)) {
         copyCut(error.text, sizeof error.text, failure.sentence);
@@ -83,8 +83,8 @@ LumoErrorEx answerEx(kj::FunctionParam<void(Connection &)> work) noexcept {
     return error;
 }
 
-capnp::Text::Reader argument(char const *text) {
-    return text != nullptr ? capnp::Text::Reader(text) : capnp::Text::Reader();
+std::string_view argument(char const *text) {
+    return text != nullptr ? std::string_view(text) : std::string_view();
 }
 
 std::string canonicalContainerId(char const *text) {

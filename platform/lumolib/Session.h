@@ -6,8 +6,7 @@
 
 #include <cstdint>
 #include <string>
-
-#include <kj/function.h>
+#include <string_view>
 
 #include "Connection.h"
 #include "lumolib/LumoLib.h"
@@ -17,13 +16,13 @@ namespace LumoClient {
 /// Runs the work with the session's connection to the ordered socket.
 /// @return 0, or the code of what was thrown (NoSession without a session), which is then also noted as the last
 ///         failure
-std::int32_t answer(kj::FunctionParam<void(Connection &)> work) noexcept;
+std::int32_t answer(FunctionRef<void(Connection &)> work) noexcept;
 
 /// The same, with the particular sentence.
-LumoErrorEx answerEx(kj::FunctionParam<void(Connection &)> work) noexcept;
+LumoErrorEx answerEx(FunctionRef<void(Connection &)> work) noexcept;
 
 /// An argument as a text; a null pointer counts as an empty text.
-capnp::Text::Reader argument(char const *text);
+std::string_view argument(char const *text);
 
 /// @return the canonical form
 /// @throw Wire::Failure InvalidArgument for a text that is no container id

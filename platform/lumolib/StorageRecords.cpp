@@ -5,13 +5,13 @@
 
 namespace LumoClient {
 
-void StorageRecords::take(Wire::Reply::Reader reply) {
+void StorageRecords::take(Compact::Reply::Reader reply) {
     switch (reply.which()) {
-    case Wire::Reply::STORAGE_ARRAYS:
+    case Compact::Reply::STORAGE_ARRAYS:
         return takeArrays(reply.getStorageArrays());
-    case Wire::Reply::STORAGE_CONTAINERS:
+    case Compact::Reply::STORAGE_CONTAINERS:
         return takeContainers(reply.getStorageContainers());
-    case Wire::Reply::DONE:
+    case Compact::Reply::DONE:
         return;
     default:
         throw connection_.unexpected("it answered something else than storage containers");
@@ -33,28 +33,28 @@ void StorageRecords::finish(StorageContainerResult &result) {
     result.containerCount = static_cast<std::uint32_t>(count);
 }
 
-void StorageRecords::takeArrays(capnp::List<Wire::StorageArray>::Reader arrays) {
+void StorageRecords::takeArrays(Compact::List<Compact::StorageArray>::Reader arrays) {
     connection_.requireChunk(arrays.size());
     StorageArrayInfo *record = arena_.records<StorageArrayInfo>(arrays.size());
     table_.reserve(table_.size() + arrays.size());
-    for (Wire::StorageArray::Reader const array : arrays) {
+    for (Compact::StorageArray::Reader const array : arrays) {
         fillArray(*record, array);
         table_.push_back(record++);
     }
 }
 
-void StorageRecords::takeContainers(capnp::List<Wire::StorageContainer>::Reader containers) {
+void StorageRecords::takeContainers(Compact::List<Compact::StorageContainer>::Reader containers) {
     connection_.requireChunk(containers.size());
     Chunk const chunk{arena_.records<StorageContainerInfo>(containers.size()), containers.size()};
     StorageContainerInfo *record = chunk.first;
-    for (Wire::StorageContainer::Reader const container : containers) {
+    for (Compact::StorageContainer::Reader const container : containers) {
         fillContainer(*record++, container);
     }
     chunks_.push_back(chunk);
 }
 
-void StorageRecords::fillArray(StorageArrayInfo &record, Wire::StorageArray::Reader array) {
-    capnp::List<Wire::Endpoint>::Reader const endpoints = array.getEndpoints();
+void StorageRecords::fillArray(StorageArrayInfo &record, Compact::StorageArray::Reader array) {
+    Compact::List<Compact::Endpoint>::Reader const endpoints = array.getEndpoints();
     record.arrayId = arena_.copy(array.getId());
     record.name = arena_.copy(array.getName());
     record.vendorId = arena_.copy(array.getVendorId());
@@ -68,8 +68,8 @@ void StorageRecords::fillArray(StorageArrayInfo &record, Wire::StorageArray::Rea
     }
 }
 
-void StorageRecords::fillEndpoint(ProtocolEndpointInfo &record, Wire::Endpoint::Reader endpoint) {
-    capnp::List<capnp::Text>::Reader const addresses = endpoint.getAddresses();
+void StorageRecords::fillEndpoint(ProtocolEndpointInfo &record, Compact::Endpoint::Reader endpoint) {
+    Compact::List<Compact::Text>::Reader const addresses = endpoint.getAddresses();
     record.localUID = endpoint.hasUid() ? arena_.copy(endpoint.getUid()) : nullptr;
     record.nfs4xAddressCount = static_cast<std::int32_t>(addresses.size());
     record.nfs4xAddresses = arena_.records<char const *>(addresses.size());
@@ -84,8 +84,8 @@ void StorageRecords::fillEndpoint(ProtocolEndpointInfo &record, Wire::Endpoint::
     record.isConfigured = endpoint.getIsConfigured() ? 1 : 0;
 }
 
-void StorageRecords::fillContainer(StorageContainerInfo &record, Wire::StorageContainer::Reader container) {
-    capnp::List<std::uint32_t>::Reader const places = container.getArrays();
+void StorageRecords::fillContainer(StorageContainerInfo &record, Compact::StorageContainer::Reader container) {
+    Compact::List<std::uint32_t>::Reader const places = container.getArrays();
     record.id = arena_.copy(container.getId());
     record.name = arena_.copy(container.getName());
     record.providerUrl = providerUrl(container.getProviderUrl());
@@ -97,7 +97,7 @@ void StorageRecords::fillContainer(StorageContainerInfo &record, Wire::StorageCo
     }
 }
 
-StorageArrayInfo **StorageRecords::arraysOf(capnp::List<std::uint32_t>::Reader places) {
+StorageArrayInfo **StorageRecords::arraysOf(Compact::List<std::uint32_t>::Reader places) {
     bool repeated = places.size() == lastArrayCount_;
     for (unsigned place = 0; place < places.size(); ++place) {
         if (places[place] >= table_.size()) {
@@ -117,7 +117,7 @@ StorageArrayInfo **StorageRecords::arraysOf(capnp::List<std::uint32_t>::Reader p
     return lastArrays_;
 }
 
-char const *StorageRecords::providerUrl(capnp::Text::Reader url) {
+char const *StorageRecords::providerUrl(std::string_view url) {
     if (url.size() != lastUrlLength_ || std::memcmp(url.begin(), lastUrl_, lastUrlLength_) != 0) {
         lastUrl_ = arena_.copy(url);
         lastUrlLength_ = url.size();

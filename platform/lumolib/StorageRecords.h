@@ -22,7 +22,7 @@ public:
         , connection_(connection) {}
 
     /// @throw Wire::Failure ProtocolError for a reply that is of another kind or contradicts itself
-    void take(Wire::Reply::Reader reply);
+    void take(Compact::Reply::Reader reply);
     /// Lays the table of all containers; call once, after the last reply.
     void finish(StorageContainerResult &result);
 
@@ -33,13 +33,13 @@ private:
         std::size_t count;
     };
 
-    void takeArrays(capnp::List<Wire::StorageArray>::Reader arrays);
-    void takeContainers(capnp::List<Wire::StorageContainer>::Reader containers);
-    void fillArray(StorageArrayInfo &record, Wire::StorageArray::Reader array);
-    void fillEndpoint(ProtocolEndpointInfo &record, Wire::Endpoint::Reader endpoint);
-    void fillContainer(StorageContainerInfo &record, Wire::StorageContainer::Reader container);
-    StorageArrayInfo **arraysOf(capnp::List<std::uint32_t>::Reader places);
-    char const *providerUrl(capnp::Text::Reader url);
+    void takeArrays(Compact::List<Compact::StorageArray>::Reader arrays);
+    void takeContainers(Compact::List<Compact::StorageContainer>::Reader containers);
+    void fillArray(StorageArrayInfo &record, Compact::StorageArray::Reader array);
+    void fillEndpoint(ProtocolEndpointInfo &record, Compact::Endpoint::Reader endpoint);
+    void fillContainer(StorageContainerInfo &record, Compact::StorageContainer::Reader container);
+    StorageArrayInfo **arraysOf(Compact::List<std::uint32_t>::Reader places);
+    char const *providerUrl(std::string_view url);
 
     Arena &arena_;
     Connection const &connection_;
