@@ -19,7 +19,8 @@ Answer<Done> unbindAndDelete(ProviderCalls const &calls, Orka::VirtualVolume con
 }
 
 Answer<ChangedVolume> deleteFound(Core &core, CallPtr const &call, FoundVolume found) {
-    return core.unbindTimer.cancel(found.volume.uuid).then([&core, call, found = std::move(found)] {
+    auto cancelled = core.unbindTimer.cancel(found.volume.uuid);
+    return cancelled.then([&core, call, found = std::move(found)] {
         ProviderCalls const calls(core.services, found.provider, call);
         return andThen(unbindAndDelete(calls, found.volume), [&core, call, volume = found.volume](Done) {
             core.log.write(LogLevel::Info, call->trace, fmt::format("deleted the virtual volume {}", volume.uuid));

@@ -41,7 +41,8 @@ OutputSpecPtr ConfigLumoAdd::GetOutputSpecInternal() {
 namespace {
 
 /// The file's first line without its newline; empty when the file cannot be read or the line is longer than a policy
-/// may be. Reads no further than that, so that a device or a pipe without a line end cannot hold the command up.
+/// may be. Reads no further than that, so that a device or a pipe without a line end cannot hold the command up. (A
+/// pipe that nobody writes into is waited for, as by any reader.)
 std::string firstLine(std::string const &path) {
     constexpr std::size_t longest = std::size_t{64} * 1024;
     std::ifstream file(path);
