@@ -67,6 +67,14 @@ void HostStore::Change::commit() {
     translated([this] { transaction_->commit(); });
 }
 
+void HostStore::checkIntegrity() {
+    translated([this] {
+        if (Sqlite::Database *const database = reader()) {
+            database->checkIntegrity();
+        }
+    });
+}
+
 int64_t HostStore::dataVersion() {
     return translated([this] {
         Sqlite::Database *const database = reader();

@@ -91,6 +91,18 @@ std::vector<Mount> HostStore::mounts() {
     });
 }
 
+std::vector<Volume> HostStore::volumes() {
+    return translated([this] {
+        Sqlite::Database *const database = reader();
+        if (database == nullptr) {
+            return std::vector<Volume>();
+        }
+        Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM volume v "
+                                       "JOIN file_system f ON f.id = v.file_system ORDER BY v.id");
+        return readAll(query);
+    });
+}
+
 std::optional<Volume> HostStore::volume(std::string_view uuid) {
     return translated([&]() -> std::optional<Volume> {
         Sqlite::Database *const database = reader();

@@ -89,6 +89,8 @@ public:
     }
     /// Changes whenever another process has changed, replaced, made or removed the file since the last call.
     int64_t dataVersion();
+    /// Reads the whole file and fails with FileMalformed for the first damage. An absent file is sound.
+    void checkIntegrity();
 
     /// In the order of registration.
     std::vector<Provider> providers();
@@ -118,6 +120,8 @@ public:
 
     /// Config volumes that are mounted, in the order of their first mount.
     std::vector<Mount> mounts();
+    /// Every config volume that the store knows, whether mounted or not, in the order of their first mount.
+    std::vector<Volume> volumes();
     /// What the store knows about a config volume on this host, whether mounted or not.
     std::optional<Volume> volume(std::string_view uuid);
     /// The mounted one of that directory name.
