@@ -71,6 +71,8 @@ public:
     ~MetaString() override;
     bool IsSet() const override;
     std::string GetValue() const;
+    /// The same without a copy; valid as long as this object.
+    std::string const &ViewValue() const;
 
 private:
     bool set_ = false;
@@ -88,6 +90,8 @@ public:
     boost::shared_ptr<MetaObject> GetElementSchema() const;
     void Append(boost::shared_ptr<MetaObject> const &element);
     std::vector<boost::shared_ptr<MetaObject>> GetElements() const;
+    /// The same without a copy; valid until an element is appended.
+    std::vector<boost::shared_ptr<MetaObject>> const &ViewElements() const;
 
 private:
     MetaType type_ = StringList;
@@ -98,6 +102,11 @@ private:
 /// A structure: named fields in declared order. A field set again replaces its value and keeps its place.
 class PLEXA_EXPORT MetaStruct : public MetaObject {
 public:
+    struct Field {
+        std::string name;
+        boost::shared_ptr<MetaObject> value;
+    };
+
     static boost::shared_ptr<MetaStruct> New(std::string const &name);
     ~MetaStruct() override;
 
@@ -119,12 +128,10 @@ public:
     std::vector<std::string> GetFieldNames() const;
     /// Empty when the structure has no such field.
     boost::shared_ptr<MetaObject> GetField(std::string const &field) const;
+    /// Names and values in declared order without a copy; valid until a field is set.
+    std::vector<Field> const &ViewFields() const;
 
 private:
-    struct Field {
-        std::string name;
-        boost::shared_ptr<MetaObject> value;
-    };
     void Store(std::string const &field, boost::shared_ptr<MetaObject> const &value);
 
     std::string name_;

@@ -74,6 +74,10 @@ std::string MetaString::GetValue() const {
     return value_;
 }
 
+std::string const &MetaString::ViewValue() const {
+    return value_;
+}
+
 boost::shared_ptr<MetaList> MetaList::New(MetaType type) {
     return New(type, boost::shared_ptr<MetaObject>());
 }
@@ -100,6 +104,10 @@ void MetaList::Append(boost::shared_ptr<MetaObject> const &element) {
 }
 
 std::vector<boost::shared_ptr<MetaObject>> MetaList::GetElements() const {
+    return elements_;
+}
+
+std::vector<boost::shared_ptr<MetaObject>> const &MetaList::ViewElements() const {
     return elements_;
 }
 

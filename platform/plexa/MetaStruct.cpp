@@ -79,6 +79,10 @@ boost::shared_ptr<MetaObject> MetaStruct::GetField(std::string const &field) con
     return {};
 }
 
+std::vector<MetaStruct::Field> const &MetaStruct::ViewFields() const {
+    return fields_;
+}
+
 void MetaStruct::Store(std::string const &field, boost::shared_ptr<MetaObject> const &value) {
     for (Field &candidate : fields_) {
         if (candidate.name == field) {

@@ -56,31 +56,38 @@ void appendEscape(std::string &to, Character const &character) {
     }
 }
 
-bool isPlainAscii(std::string_view text) {
-    return std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c < '\x7F'; });
-}
-
 /// Lets this thread's wcwidth know every character, whatever the user's locale is: output is always UTF-8.
 class WidthLocale {
 public:
     WidthLocale()
-        : utf8_(newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr))
-        , before_(utf8_ != nullptr ? uselocale(utf8_) : nullptr) {}
+        : before_(utf8() != nullptr ? uselocale(utf8()) : nullptr) {}
     ~WidthLocale() {
-        if (utf8_ != nullptr) {
+        if (before_ != nullptr) {
             uselocale(before_);
-            freelocale(utf8_);
         }
     }
     WidthLocale(WidthLocale const &) = delete;
     WidthLocale &operator=(WidthLocale const &) = delete;
 
 private:
-    locale_t utf8_;
+    /// Read from disk, so once a process, and by those only that meet more than ASCII.
+    static locale_t utf8() {
+        static locale_t const locale = newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr);
+        return locale;
+    }
+
     locale_t before_;
 };
 
 } // namespace
+
+bool isPlainAscii(std::string_view text) {
+    bool plain = true;
+    for (char const c : text) { // without a way out, so that it is done many bytes at a time
+        plain &= c >= ' ' && c != '\x7F';
+    }
+    return plain;
+}
 
 bool isValidUtf8(std::string_view text) {
     while (!text.empty()) {
@@ -128,7 +135,7 @@ std::string escaped(std::string_view text, Lines lines) {
 
 std::size_t displayWidth(std::string_view text) {
     if (isPlainAscii(text)) {
-        return text.size(); // needs no locale, which would have to be read from disk
+        return text.size();
     }
     WidthLocale const locale;
     std::size_t width = 0;

@@ -2,6 +2,7 @@
 #include "plexa/Formatter.h"
 
 #include "Formats.h"
+#include "ResultModel.h"
 #include "plexa/UsageError.h"
 
 namespace Plexa {
@@ -9,12 +10,17 @@ namespace Plexa {
 namespace {
 
 constexpr Format formats[] = {
-    {"simple", false, writeSimple},
-    {"table", false, writeTable},
-    {"json", true, writeJson},
+    {"simple", false, writeSimple}, {"table", false, writeTable},      {"tree", false, writeTree},
+    {"json", true, writeJson},      {"yaml", true, writeYaml},         {"xml", true, writeXml},
+    {"csv", true, writeCsv},        {"keyvalue", true, writeKeyValue},
 };
 
 } // namespace
+
+void Format::write(Result const &result, FormatSettings const &settings, Sink &sink) const {
+    checkShape(result, name);
+    emit(result, settings, sink);
+}
 
 Format const *findFormat(std::string const &name) {
     for (Format const &format : formats) {
@@ -37,7 +43,12 @@ std::string formatNames() {
 Format const &requireFormat(std::string const &name, std::string const &origin) {
     Format const *format = findFormat(name);
     if (format == nullptr) {
-        throw UsageError(origin + ": unknown format " + shownWord(name) + "; there is " + formatNames());
+        std::vector<std::string> names;
+        for (Format const &each : formats) {
+            names.emplace_back(each.name);
+        }
+        throw UsageError(origin + ": unknown format " + shownWord(name) + didYouMean(nearNames(name, names)) +
+                         "; there is " + formatNames());
     }
     return *format;
 }

@@ -3,7 +3,7 @@
 
 #include <fmt/format.h>
 
-#include "plexa/Text.h"
+#include "JsonEscapes.h"
 
 namespace Plexa {
 
@@ -13,7 +13,9 @@ void appendUnit(std::string &to, unsigned unit) {
     fmt::format_to(std::back_inserter(to), "\\u{:04x}", unit);
 }
 
-void appendCharacter(std::string &to, Character const &character) {
+} // namespace
+
+void appendJsonCharacter(std::string &to, Character const &character) {
     if (!character.valid) {
         fmt::format_to(std::back_inserter(to), "\\\\x{:02x}", static_cast<unsigned char>(character.bytes.front()));
     } else if (character.code == U'"' || character.code == U'\\') {
@@ -32,22 +34,10 @@ void appendCharacter(std::string &to, Character const &character) {
     }
 }
 
-} // namespace
-
-// RapidJSON's writer either trusts its input to be UTF-8 or, told to check, stops in the middle of the document.
 std::string jsonText(std::string_view text) {
-    std::string json = "\"";
+    std::string json;
     json.reserve(text.size() + 2);
-    while (!text.empty()) {
-        char const front = text.front();
-        if (front >= ' ' && front < '\x7F' && front != '"' && front != '\\') {
-            json += front;
-            text.remove_prefix(1);
-        } else {
-            appendCharacter(json, takeCharacter(text));
-        }
-    }
-    json += '"';
+    writeJsonText(json, text);
     return json;
 }
 

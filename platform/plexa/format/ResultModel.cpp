@@ -2,7 +2,10 @@
 #include "ResultModel.h"
 
 #include <algorithm>
+#include <typeinfo>
 #include <utility>
+
+#include "plexa/Text.h"
 
 namespace Plexa {
 
@@ -10,22 +13,35 @@ using namespace MetaObj;
 
 namespace {
 
-template <typename Value>
-Value const *as(Object const &object) {
-    return dynamic_cast<Value const *>(object.get());
-}
+constexpr std::size_t deepest = 64;
 
-Kind kindOfOne(Object const &object) {
-    if (object == nullptr) {
-        return Kind::Nothing;
+/// The type as it was made; Unset for none. A class that derives from one of MetaObj's counts as that one.
+ValueType declaredType(MetaObject const *value) {
+    if (value == nullptr) {
+        return ValueType::Unset;
     }
-    if (auto const *list = as<MetaList>(object)) {
-        return list->GetType() == StructList ? Kind::StructList : Kind::ScalarList;
+    std::type_info const *const type = &typeid(*value);
+    if (type == &typeid(MetaString)) {
+        return ValueType::Text;
     }
-    if (as<MetaStruct>(object) != nullptr) {
-        return Kind::Struct;
+    if (type == &typeid(MetaInt)) {
+        return ValueType::Number;
     }
-    return as<MetaInt>(object) != nullptr ? Kind::Number : Kind::Scalar;
+    if (type == &typeid(MetaBool)) {
+        return ValueType::Boolean;
+    }
+    if (type == &typeid(MetaList)) {
+        return ValueType::List;
+    }
+    if (type == &typeid(MetaStruct)) {
+        return ValueType::Struct;
+    }
+    return dynamic_cast<MetaString const *>(value) != nullptr   ? ValueType::Text
+           : dynamic_cast<MetaInt const *>(value) != nullptr    ? ValueType::Number
+           : dynamic_cast<MetaBool const *>(value) != nullptr   ? ValueType::Boolean
+           : dynamic_cast<MetaList const *>(value) != nullptr   ? ValueType::List
+           : dynamic_cast<MetaStruct const *>(value) != nullptr ? ValueType::Struct
+                                                                : ValueType::Unknown;
 }
 
 StructurePlan selected(StructurePlan const &fields, std::vector<std::string> const &names) {
@@ -40,68 +56,167 @@ StructurePlan selected(StructurePlan const &fields, std::vector<std::string> con
     return chosen;
 }
 
+bool haveNames(std::vector<MetaStruct::Field> const &fields, std::vector<std::string> const &names) {
+    return std::equal(fields.begin(), fields.end(), names.begin(), names.end(),
+                      [](MetaStruct::Field const &field, std::string const &name) { return field.name == name; });
+}
+
+/// Walks through a result and remembers the field it is in.
+class ShapeCheck {
+public:
+    explicit ShapeCheck(std::string const &format)
+        : format_(format) {}
+
+    void check(MetaObject const *value, std::size_t depth) {
+        if (depth > deepest) {
+            refuse("is nested deeper than " + std::to_string(deepest) + " levels");
+        }
+        switch (typeOf(value)) {
+        case ValueType::List:
+            for (Object const &element : as<MetaList>(value).ViewElements()) {
+                check(element.get(), depth + 1);
+            }
+            break;
+        case ValueType::Struct:
+            for (MetaStruct::Field const &field : as<MetaStruct>(value).ViewFields()) {
+                std::string const *const around = std::exchange(field_, &field.name);
+                check(field.value.get(), depth + 1);
+                field_ = around;
+            }
+            break;
+        case ValueType::Unknown:
+            refuse("is of a kind that it does not know");
+        default:
+            break;
+        }
+    }
+
+private:
+    [[noreturn]] void refuse(std::string const &why) const {
+        throw FormatError("the format " + format_ + " cannot hold the result: " +
+                          (field_ != nullptr ? "the field '" + escaped(*field_) + "' " : "its value ") + why);
+    }
+
+    std::string const &format_;
+    std::string const *field_ = nullptr;
+};
+
 } // namespace
 
-Kind kindOf(Object const &value, Object const &schema) {
-    return kindOfOne(value != nullptr ? value : schema);
+ValueType typeOf(MetaObject const *value) {
+    ValueType const type = declaredType(value);
+    bool const isScalar = type == ValueType::Text || type == ValueType::Number || type == ValueType::Boolean;
+    return isScalar && !value->IsSet() ? ValueType::Unset : type;
+}
+
+Kind kindOf(MetaObject const *value, MetaObject const *schema) {
+    MetaObject const *const one = value != nullptr ? value : schema;
+    switch (declaredType(one)) {
+    case ValueType::Unset:
+        return Kind::Nothing;
+    case ValueType::List:
+        return as<MetaList>(one).GetType() == StructList ? Kind::StructList : Kind::ScalarList;
+    case ValueType::Struct:
+        return Kind::Struct;
+    case ValueType::Number:
+        return Kind::Number;
+    default:
+        return Kind::Scalar;
+    }
 }
 
 bool isSet(Object const &value) {
     return value != nullptr && value->IsSet();
 }
 
-std::string scalarText(Object const &value) {
-    if (!isSet(value)) {
+std::string scalarText(MetaObject const *value) {
+    switch (typeOf(value)) {
+    case ValueType::Text:
+        return as<MetaString>(value).ViewValue();
+    case ValueType::Number:
+        return std::to_string(as<MetaInt>(value).GetValue());
+    case ValueType::Boolean:
+        return as<MetaBool>(value).GetValue() ? "true" : "false";
+    default:
         return {};
     }
-    if (auto const *text = as<MetaString>(value)) {
-        return text->GetValue();
-    }
-    if (auto const *number = as<MetaInt>(value)) {
-        return std::to_string(number->GetValue());
-    }
-    if (auto const *truth = as<MetaBool>(value)) {
-        return truth->GetValue() ? "true" : "false";
-    }
-    return {};
 }
 
-Object elementSchema(Object const &list, Object const &schema) {
-    auto const *made = as<MetaList>(list);
-    auto const *declared = as<MetaList>(schema);
-    Object element = declared != nullptr ? declared->GetElementSchema() : Object();
-    return element == nullptr && made != nullptr ? made->GetElementSchema() : element;
+Object elementSchema(MetaList const *list, MetaObject const *schema) {
+    Object element = declaredType(schema) == ValueType::List ? as<MetaList>(schema).GetElementSchema() : Object();
+    return element == nullptr && list != nullptr ? list->GetElementSchema() : element;
 }
 
-StructurePlans::StructurePlans(FormatSettings const &settings, Choice choice)
+void checkShape(Result const &result, std::string const &format) {
+    ShapeCheck(format).check(result.value.get(), 0);
+}
+
+MetaObject const *findValue(MetaStruct const &structure, FieldPlan const &field) {
+    std::vector<MetaStruct::Field> const &fields = structure.ViewFields();
+    if (field.index < fields.size() && fields[field.index].name == field.name) {
+        return fields[field.index].value.get();
+    }
+    for (MetaStruct::Field const &candidate : fields) {
+        if (candidate.name == field.name) {
+            return candidate.value.get();
+        }
+    }
+    return nullptr;
+}
+
+void merge(StructurePlan &plan, StructurePlan const &more) {
+    for (FieldPlan const &field : more) {
+        bool const isKnown = std::any_of(plan.begin(), plan.end(),
+                                         [&field](FieldPlan const &known) { return known.name == field.name; });
+        if (!isKnown) {
+            plan.push_back(field);
+        }
+    }
+}
+
+StructurePlans::StructurePlans(FormatSettings const &settings, Choice choice, Label label)
     : settings_(settings)
-    , choice_(std::move(choice)) {}
+    , choice_(std::move(choice))
+    , label_(label) {}
 
-std::shared_ptr<StructurePlan const> StructurePlans::planOf(MetaStruct const &structure, Object const &schema) {
-    std::vector<std::string> names = structure.GetFieldNames();
-    Known &known = known_[schema.get()];
-    if (known.plan != nullptr && known.names == names) {
-        return known.plan;
+std::shared_ptr<StructurePlan const> StructurePlans::planOf(MetaStruct const &structure, MetaObject const *schema) {
+    if (last_ == nullptr || lastSchema_ != schema) {
+        last_ = &known_[schema];
+        lastSchema_ = schema;
     }
-    StructurePlan fields;
-    auto const *declared = as<MetaStruct>(schema);
-    std::string const name = declared != nullptr ? declared->GetName() : structure.GetName();
-    if (declared != nullptr) {
-        for (std::string const &field : declared->GetFieldNames()) {
-            fields.push_back({field, declared->GetField(field), settings_.unit(name, field)});
-        }
+    Known &known = *last_;
+    bool const isKnown = known.plan != nullptr && haveNames(structure.ViewFields(), known.names) &&
+                         (schema != nullptr || known.structure == structure.GetName());
+    if (!isKnown) {
+        known.structure = structure.GetName();
+        known.names = structure.GetFieldNames();
+        known.plan = std::make_shared<StructurePlan const>(made(structure, schema));
     }
-    for (std::string const &field : names) {
-        if (declared == nullptr || declared->GetField(field) == nullptr) {
-            fields.push_back({field, Object(), settings_.unit(name, field)});
-        }
-    }
-    if (std::optional<std::vector<std::string>> const chosen = choice_(name)) {
-        fields = selected(fields, *chosen);
-    }
-    known.names = std::move(names);
-    known.plan = std::make_shared<StructurePlan const>(std::move(fields));
     return known.plan;
+}
+
+StructurePlan StructurePlans::made(MetaStruct const &structure, MetaObject const *schema) const {
+    bool const isDeclared = declaredType(schema) == ValueType::Struct;
+    std::string const name = isDeclared ? as<MetaStruct>(schema).GetName() : structure.GetName();
+    StructurePlan plan;
+    std::map<std::string, std::size_t> places; // of the plan's fields
+    if (isDeclared) {
+        for (MetaStruct::Field const &field : as<MetaStruct>(schema).ViewFields()) {
+            places.emplace(field.name, plan.size());
+            plan.push_back({field.name, field.value, settings_.unit(name, field.name), label_(field.name)});
+        }
+    }
+    std::vector<MetaStruct::Field> const &fields = structure.ViewFields();
+    for (std::size_t i = 0; i < fields.size(); ++i) {
+        std::string const &field = fields[i].name;
+        auto const [place, isNew] = places.emplace(field, plan.size());
+        if (isNew) {
+            plan.push_back({field, Object(), settings_.unit(name, field), label_(field)});
+        }
+        plan[place->second].index = i;
+    }
+    std::optional<std::vector<std::string>> const chosen = choice_(name);
+    return chosen ? selected(plan, *chosen) : plan;
 }
 
 } // namespace Plexa

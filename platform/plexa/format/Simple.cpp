@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Formats.h"
+#include "Paint.h"
 #include "ResultModel.h"
 #include "TextBuffer.h"
 #include "plexa/Text.h"
@@ -16,79 +17,87 @@ class SimpleWriter {
 public:
     SimpleWriter(FormatSettings const &settings, Sink &sink)
         : settings_(settings)
-        , plans_(settings, [&settings](std::string const &structure) { return settings.fields(structure); })
+        , paint_(settings.display())
+        , plans_(
+              settings, [&settings](std::string const &structure) { return settings.fields(structure); },
+              [](std::string const &name) { return escaped(name); })
         , out_(sink) {}
 
-    void value(Object const &value, Object const &schema, std::size_t indent) {
-        switch (kindOf(value, schema)) {
-        case Kind::Nothing:
+    void value(MetaObject const *value, MetaObject const *schema, std::size_t indent) {
+        switch (typeOf(value)) {
+        case ValueType::Unset:
             break;
-        case Kind::Scalar:
-        case Kind::Number:
-            if (isSet(value)) {
-                out_.print("{:{}}{}\n", "", indent, escaped(scalarText(value)));
-            }
+        case ValueType::List:
+            elements(as<MetaList>(value), schema, indent);
             break;
-        case Kind::ScalarList:
-        case Kind::StructList:
-            elements(value, schema, indent);
+        case ValueType::Struct:
+            structure(as<MetaStruct>(value), schema, indent);
             break;
-        case Kind::Struct:
-            structure(value, schema, indent);
-            break;
+        default:
+            out_.fill(indent, ' ');
+            scalar(value);
+            out_.put('\n');
         }
     }
 
 private:
-    void elements(Object const &list, Object const &schema, std::size_t indent) {
-        auto const made = boost::dynamic_pointer_cast<MetaList>(list);
-        if (made == nullptr) {
-            return;
+    void scalar(MetaObject const *value) {
+        if (typeOf(value) == ValueType::Number) {
+            out_.number(as<MetaInt>(value).GetValue());
+        } else {
+            out_.append(escaped(scalarText(value)));
         }
-        Object const element = elementSchema(list, schema);
+    }
+
+    void elements(MetaList const &list, MetaObject const *schema, std::size_t indent) {
+        Object const element = elementSchema(&list, schema);
         bool first = true;
-        for (Object const &each : made->GetElements()) {
+        for (Object const &each : list.ViewElements()) {
             // A heading sets a nested structure off from the one before; without one, or outermost, a blank line does.
-            auto const asStruct = boost::dynamic_pointer_cast<MetaStruct>(each);
-            if (asStruct != nullptr && !first && (indent == 0 || settings_.header(*asStruct).empty())) {
-                out_.print("\n");
+            bool const isStruct = typeOf(each.get()) == ValueType::Struct;
+            if (isStruct && !first && (indent == 0 || settings_.header(as<MetaStruct>(each.get())).empty())) {
+                out_.put('\n');
             }
-            value(each, element, indent);
+            value(each.get(), element.get(), indent);
             first = false;
         }
     }
 
-    void structure(Object const &object, Object const &schema, std::size_t indent) {
-        auto const made = boost::dynamic_pointer_cast<MetaStruct>(object);
-        if (made == nullptr) {
-            return;
-        }
-        std::string const header = settings_.header(*made);
+    void structure(MetaStruct const &structure, MetaObject const *schema, std::size_t indent) {
+        std::string const header = settings_.header(structure);
         if (!header.empty()) {
-            out_.print("{:{}}{}\n", "", indent, escaped(header));
+            out_.fill(indent, ' ');
+            out_.print(paint_.heading, escaped(header), paint_.end, "\n");
             indent += step;
         }
-        std::shared_ptr<StructurePlan const> const plan = plans_.planOf(*made, schema);
+        std::shared_ptr<StructurePlan const> const plan = plans_.planOf(structure, schema);
         for (FieldPlan const &planned : *plan) {
-            field(planned, made->GetField(planned.name), indent);
+            field(planned, valueOf(structure, planned), indent);
         }
     }
 
-    void field(FieldPlan const &field, Object const &value, std::size_t indent) {
-        if (!isSet(value)) {
+    void field(FieldPlan const &field, MetaObject const *value, std::size_t indent) {
+        ValueType const type = typeOf(value);
+        if (type == ValueType::Unset) {
             return;
         }
-        Kind const kind = kindOf(value, field.schema);
-        if (kind == Kind::Scalar || kind == Kind::Number) {
-            out_.print("{:{}}{}: {}{}{}\n", "", indent, escaped(field.name), escaped(scalarText(value)),
-                       field.unit.empty() ? "" : " ", escaped(field.unit));
+        out_.fill(indent, ' ');
+        out_.print(paint_.label, field.label, ":", paint_.end);
+        if (type == ValueType::List || type == ValueType::Struct) {
+            out_.put('\n');
+            this->value(value, field.schema.get(), indent + step);
         } else {
-            out_.print("{:{}}{}:\n", "", indent, escaped(field.name));
-            this->value(value, field.schema, indent + step);
+            out_.put(' ');
+            scalar(value);
+            if (!field.unit.empty()) {
+                out_.print(" ", escaped(field.unit));
+            }
+            out_.put('\n');
         }
     }
 
     FormatSettings const &settings_;
+    Paint paint_;
     StructurePlans plans_;
     TextBuffer out_;
 };
@@ -97,14 +106,15 @@ private:
 
 void writeSimple(Result const &result, FormatSettings const &settings, Sink &sink) {
     // A text that is the whole result may bring its line end along.
-    if (auto const text = boost::dynamic_pointer_cast<MetaString>(result.value);
-        text != nullptr && text->IsSet() && text->GetValue().ends_with('\n')) {
-        std::string line = text->GetValue();
-        line.pop_back();
-        SimpleWriter(settings, sink).value(MetaString::New(line), result.schema, 0);
-        return;
+    if (typeOf(result.value.get()) == ValueType::Text) {
+        std::string line = scalarText(result.value.get());
+        if (line.ends_with('\n')) {
+            line.pop_back();
+            SimpleWriter(settings, sink).value(MetaString::New(line).get(), result.schema.get(), 0);
+            return;
+        }
     }
-    SimpleWriter(settings, sink).value(result.value, result.schema, 0);
+    SimpleWriter(settings, sink).value(result.value.get(), result.schema.get(), 0);
 }
 
 } // namespace Plexa

@@ -61,8 +61,10 @@ TEST(FormatSettings, ChosenFieldsMustBeDeclared) {
 }
 
 TEST(FormatSettings, UnknownFormatSaysWhatThereIs) {
-    EXPECT_EQ(mistakeOf([] { Plexa::requireFormat("yml", "--format"); }),
-              "--format: unknown format 'yml'; there is simple, table, json");
+    EXPECT_EQ(
+        mistakeOf([] { Plexa::requireFormat("yml", "--format"); }),
+        "--format: unknown format 'yml'; did you mean 'yaml' or 'xml'?; there is simple, table, tree, json, yaml, xml, "
+        "csv, keyvalue");
 }
 
 } // namespace

@@ -1,12 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// From a result to text. A formatter knows values and schemas, never commands; it writes as it goes, so that a long
-// list is on its way before its end is formatted.
+// From a result to text. A formatter knows values and schemas, never commands. It writes as it walks: beside the result
+// itself it holds one buffer of bounded size and one row, however long the list is.
 //
 // A new format is one file in format/ with one function, and one line in the table in Formatters.cpp.
 #pragma once
 
+#include <exception>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <boost/shared_ptr.hpp>
@@ -23,17 +25,37 @@ struct Result {
     boost::shared_ptr<MetaObj::MetaObject> schema;
 };
 
+/// A result that a format cannot hold. The sentence names the format and the field, ready to be shown.
+class FormatError : public std::exception {
+public:
+    explicit FormatError(std::string sentence)
+        : sentence_(std::move(sentence)) {}
+    std::string const &sentence() const noexcept {
+        return sentence_;
+    }
+    char const *what() const noexcept override {
+        return sentence_.c_str();
+    }
+
+private:
+    std::string sentence_;
+};
+
 struct Format {
     char const *name;
     /// For programs: one whole document, every declared field, no units, errors as documents too.
     bool isMachine;
-    void (*write)(Result const &result, FormatSettings const &settings, Sink &sink);
+    void (*emit)(Result const &result, FormatSettings const &settings, Sink &sink);
+
+    /// Writes one whole document. Whether it arrived is told by the sink.
+    /// @throws FormatError before anything is written
+    void write(Result const &result, FormatSettings const &settings, Sink &sink) const;
 };
 
 /// @return null for a name that is no format's.
 Format const *findFormat(std::string const &name);
 
-/// "simple, table, json": what there is.
+/// "simple, table, ...": what there is.
 std::string formatNames();
 
 /// @throws UsageError that says what there is

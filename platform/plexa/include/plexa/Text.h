@@ -15,6 +15,9 @@
 
 namespace Plexa {
 
+/// Whether a text can be shown as it is and takes one column a byte.
+bool isPlainAscii(std::string_view text);
+
 bool isValidUtf8(std::string_view text);
 
 /// One character taken from the front of a text.
