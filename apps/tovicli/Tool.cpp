@@ -280,10 +280,15 @@ ExitStatus Tool::runCommand(AutoCli::Command &command, CommandLine const &line) 
     FormatSettings const formatting = formatSettings(command, schema);
 
     Outcome const outcome = work(command, line);
+    std::string unheld; // why the format cannot hold the result
     if (outcome.result != nullptr) {
         CountingSink counted(context_.output);
         std::chrono::microseconds const began = trace_.isEnabled() ? trace_.elapsed() : std::chrono::microseconds(0);
-        format.write({outcome.result, schema}, formatting, trace_.isEnabled() ? counted : context_.output);
+        try {
+            format.write({outcome.result, schema}, formatting, trace_.isEnabled() ? counted : context_.output);
+        } catch (FormatError const &error) {
+            unheld = error.sentence();
+        }
         if (trace_.isEnabled()) {
             Trace::Event(trace_, "output")
                 .text("format", format.name)
@@ -292,7 +297,13 @@ ExitStatus Tool::runCommand(AutoCli::Command &command, CommandLine const &line) 
         }
     }
     tell(outcome);
-    return written(outcome.status, outcome.status == ExitStatus::Completed ? "; the command itself was completed" : "");
+    std::string const whatWasDone =
+        outcome.status == ExitStatus::Completed ? "; the command itself was completed" : "";
+    if (!unheld.empty()) {
+        report_.fail(unheld + whatWasDone);
+        return ExitStatus::Unwritten;
+    }
+    return written(outcome.status, whatWasDone);
 }
 
 Outcome Tool::work(AutoCli::Command &command, CommandLine const &line) {
@@ -319,11 +330,12 @@ Outcome Tool::work(AutoCli::Command &command, CommandLine const &line) {
 FormatSettings Tool::formatSettings(AutoCli::Command &command,
                                     boost::shared_ptr<MetaObj::MetaObject> const &schema) const {
     FormatSettings formatting;
+    formatting.setDisplay(context_.display);
     for (auto const &[key, value] : command.GetDefaultOutputFormatParameters()) {
         formatting.set(key, value);
     }
     for (std::string const &parameter : settings_.formatParameters) {
-        formatting.setFromUser(parameter);
+        formatting.setFromUser(parameter, schema);
     }
     if (settings_.fields) {
         boost::shared_ptr<MetaObj::MetaStruct> const structure = outermostStructure(schema);

@@ -17,6 +17,7 @@
 #include "PluginSource.h"
 #include "Settings.h"
 #include "Trace.h"
+#include "plexa/Display.h"
 #include "plexa/FormatSettings.h"
 #include "plexa/Formatter.h"
 
@@ -38,6 +39,8 @@ struct Context {
     Activity *activity = nullptr;
     /// Time for traces; empty: the process's own.
     Trace::Clock clock = {};
+    /// What the output is read on.
+    Plexa::Display display = {};
 };
 
 class Tool {

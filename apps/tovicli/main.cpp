@@ -84,6 +84,13 @@ std::size_t terminalWidth() {
     return isTerminal && size.ws_col > 0 ? size.ws_col : 80;
 }
 
+Plexa::Display outputDisplay(Tovicli::Environment const &environment) {
+    winsize size{};
+    bool const isTerminal = ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0;
+    return Plexa::displayOf(isTerminal, size.ws_col,
+                            [&environment](std::string const &name) { return environment.get(name); });
+}
+
 } // namespace
 
 int main(int argc, char **argv) {
@@ -100,5 +107,6 @@ int main(int argc, char **argv) {
                              randomRequestId, {installed + "/lib/tovicli/plugins", workingDirectory()},
                              terminalWidth(), getauxval(AT_SECURE) != 0,
                              &activity,       {}};
+    context.display = outputDisplay(environment);
     return static_cast<int>(Tovicli::Tool(context).run(std::vector<std::string>(argv, argv + argc)));
 }
