@@ -62,7 +62,7 @@ void PluginList::ExecuteInternal(InputPtr const &, OutputPtr const &output) {
             row->SetField("ABI", abi);
         }
         if (!failed.empty() || !registered) {
-            row->SetField("Reason", !failed.empty()  ? failed
+            row->SetField("Reason", !failed.empty()    ? failed
                                     : !skipped.empty() ? skipped
                                                        : std::string("nothing is loaded from its directory"));
         }

@@ -3,6 +3,8 @@
 
 #include "CliServices.h"
 #include "CommandList.h"
+#include "Complete.h"
+#include "CompletionScript.h"
 #include "Describe.h"
 #include "PluginCheck.h"
 #include "PluginList.h"
@@ -26,7 +28,7 @@ boost::shared_ptr<AutoCli::Namespace> described(char const *description) {
 } // namespace
 
 void Tovicli_RegisterCli(boost::shared_ptr<AutoCli::NamespaceNode> const &cli, Tovicli::CliServices &services,
-                         bool) {
+                         bool completing) {
     auto const command = described("The commands of the tool.");
     command->RegisterNamespaceNode(made<CommandList>(services), "list");
     cli->RegisterNamespaceNode(command, "command");
@@ -37,4 +39,9 @@ void Tovicli_RegisterCli(boost::shared_ptr<AutoCli::NamespaceNode> const &cli, T
     plugin->RegisterNamespaceNode(made<PluginList>(services), "list");
     plugin->RegisterNamespaceNode(made<PluginCheck>(services), "check");
     cli->RegisterNamespaceNode(plugin, "plugin");
+
+    cli->RegisterNamespaceNode(made<CompletionScript>(services), "completion");
+    if (completing) { // nobody else's business
+        cli->RegisterNamespaceNode(made<Complete>(services), "complete");
+    }
 }

@@ -20,6 +20,7 @@ using Candidates = std::vector<Candidate>;
 using Containers = std::unique_ptr<StorageContainerResult, decltype(&LumoLib_FreeStorageContainerResult)>;
 
 constexpr int32_t mostVolumes = 1000;
+constexpr int mostSessions = 1000; // closing one that is not open does nothing
 
 /// A session with the daemon, if there is one. It reads its settings from the environment.
 class Session {
@@ -27,6 +28,10 @@ public:
     explicit Session(LiveQuery const &query) {
         if (query.offline) {
             return;
+        }
+        // The plug-ins were registered offline and hold sessions that stay so: they are given up for a new one.
+        for (int opened = 0; opened < mostSessions; ++opened) {
+            LumoLib_Exit();
         }
         setenv("TOVI_ROOT", query.root.c_str(), 1);
         setenv("TOVI_TIMEOUT_MS", std::to_string(query.patience.count()).c_str(), 1);

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// Names that the host's store and its daemon know, for whoever completes a word. Nothing is changed, nothing fails: what
-// cannot be had in time is not offered. A store with an unfinished transaction is not even opened, since whoever opens
-// it would finish it.
+// Names that the host's store and its daemon know, for whoever completes a word. Nothing is changed, nothing fails:
+// what cannot be had in time is not offered. A store with an unfinished transaction is not even opened, since whoever
+// opens it would finish it.
 #pragma once
 
 #include <chrono>

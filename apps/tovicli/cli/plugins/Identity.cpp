@@ -52,8 +52,7 @@ Identity identityOf(int descriptor) {
     Identity identity;
     if (ident[EI_CLASS] != __ehdr_start.e_ident[EI_CLASS]) {
         identity.differences.push_back({"class", std::string("it was built for ") + className(ident[EI_CLASS]) +
-                                                     ", this tool for " +
-                                                     className(__ehdr_start.e_ident[EI_CLASS])});
+                                                     ", this tool for " + className(__ehdr_start.e_ident[EI_CLASS])});
         return identity; // the rest of its header is laid out otherwise
     }
     if (ident[EI_DATA] != __ehdr_start.e_ident[EI_DATA]) {

@@ -108,8 +108,8 @@ private:
         ++at_;
         while (at_ < line_.size() && line_[at_] != '"') {
             char const c = line_[at_];
-            bool const escapes = c == '\\' && at_ + 1 < line_.size() &&
-                                 escapedInQuotes.find(line_[at_ + 1]) != std::string_view::npos;
+            bool const escapes =
+                c == '\\' && at_ + 1 < line_.size() && escapedInQuotes.find(line_[at_ + 1]) != std::string_view::npos;
             if (escapes) {
                 ++at_;
             } else if (expansions.find(c) != std::string_view::npos) {
@@ -150,8 +150,7 @@ Unfinished splitUnfinished(std::string_view line) {
 }
 
 std::string quotedWord(std::string const &word) {
-    constexpr std::string_view plain =
-        "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789-_./:=,+@%";
+    constexpr std::string_view plain = "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789-_./:=,+@%";
     bool const isPlain = word.find_first_not_of(plain) == std::string::npos;
     if (!word.empty() && isPlain) {
         return word;
