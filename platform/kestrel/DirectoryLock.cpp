@@ -27,8 +27,7 @@ DirectoryLock::DirectoryLock(Directory const &directory, std::chrono::millisecon
         if (std::chrono::steady_clock::now() >= deadline) {
             throw Wire::Failure(Wire::ErrorCode::FileBusy, "the directory '" + directory.path +
                                                                "' is busy: another process has held its lock for " +
-                                                               std::to_string(timeout.count()) +
-                                                               " ms; nothing was changed, try again");
+                                                               std::to_string(timeout.count()) + " ms");
         }
         std::this_thread::sleep_for(pause);
         pause = std::min(pause * 2, std::chrono::milliseconds{50});

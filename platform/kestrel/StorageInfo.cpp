@@ -35,6 +35,16 @@ Gantry::Storage::VendorProviderInfo fromStore(Store::Provider const &provider) {
     return record;
 }
 
+/// Asked after a failure, because a commit that failed may have taken effect.
+bool isRecorded(Host &host, Store::FileSystem const &fileSystem, bool whenUnreadable) {
+    try {
+        auto const record = host.store.fileSystem(fileSystem.containerId);
+        return record && record->name == fileSystem.name;
+    } catch (Wire::Failure const &) {
+        return whenUnreadable;
+    }
+}
+
 /// The directory first: a killed process leaves at worst an empty directory, which the next add takes over.
 void addToHost(Host &host, Store::FileSystem const &fileSystem, bool mount) {
     bool const made = mount && makeIn(host.places.volumes(), fileSystem.name, 0755);
@@ -46,7 +56,7 @@ void addToHost(Host &host, Store::FileSystem const &fileSystem, bool mount) {
         }
         host.store.addFileSystem(fileSystem);
     } catch (Wire::Failure const &) {
-        if (made) {
+        if (made && !isRecorded(host, fileSystem, false)) {
             removeEmptyIn(host.places.volumes(), fileSystem.name);
         }
         throw;
@@ -75,7 +85,9 @@ void removeFromHost(Host &host, std::string const &containerId) {
     try {
         host.store.removeFileSystem(containerId);
     } catch (Wire::Failure const &) {
-        makeIn(volumes, fileSystem->name, 0755);
+        if (isRecorded(host, *fileSystem, true)) {
+            makeIn(volumes, fileSystem->name, 0755);
+        }
         throw;
     }
 }

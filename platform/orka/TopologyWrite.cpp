@@ -4,9 +4,11 @@
 #include <cerrno>
 #include <filesystem>
 #include <memory>
+#include <string_view>
 #include <system_error>
 
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -15,7 +17,9 @@
 #include "RandomUuid.h"
 #include "TopologyRows.h"
 #include "orka/Topology.h"
+#include "wire/ContainerId.h"
 #include "wire/Failure.h"
+#include "wire/UniqueFd.h"
 
 namespace Orka {
 
@@ -39,39 +43,86 @@ bool exists(std::string const &path) {
     return lstat(path.c_str(), &status) == 0;
 }
 
-/// A file of this process's own beside the one to be made; goes away with the object.
+constexpr std::string_view draftSuffix = ".new";
+
+std::filesystem::path directoryOf(std::string const &path) {
+    auto const directory = std::filesystem::path(path).parent_path();
+    return directory.empty() ? std::filesystem::path(".") : directory;
+}
+
+/// A directory of this process's own beside the file to be made, with the file in it; goes away with the object. It is
+/// locked as long as its maker lives, so that the next maker can tell what a killed one left. The lock is the
+/// directory's because SQLite's own locks lie on the file.
 class Draft {
 public:
-    explicit Draft(std::string const &target)
-        : path_(target + "." + randomUuid() + ".new") {
-        int const file = open(path_.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC | O_NOFOLLOW, 0666);
-        if (file < 0) {
-            failMaking(target, errno);
-        }
-        close(file);
+    explicit Draft(std::string const &target) {
+        removeAbandoned(target);
+        do {
+            directory_ = target + "." + randomUuid() + std::string(draftSuffix);
+            if (mkdir(directory_.c_str(), S_IRWXU) != 0) {
+                failMaking(target, errno);
+            }
+            lock_.reset(openDirectory(directory_));
+        } while (!hold()); // another maker came by before the lock and took it for abandoned
     }
     ~Draft() {
-        unlink(path_.c_str());
-        unlink((path_ + "-journal").c_str());
+        remove(directory_);
     }
     Draft(Draft const &) = delete;
     Draft &operator=(Draft const &) = delete;
 
-    std::string const &path() const noexcept {
-        return path_;
+    std::string path() const {
+        return directory_ + "/array";
     }
 
 private:
-    std::string path_;
+    bool hold() const {
+        // Where directories cannot be locked nothing is ever taken for abandoned.
+        bool const isTaken = flock(lock_.get(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK;
+        return !isTaken && exists(directory_);
+    }
+
+    static int openDirectory(std::string const &path) {
+        return open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC);
+    }
+
+    static void remove(std::string const &directory) {
+        for (char const *const name : {"/array", "/array-journal"}) {
+            unlink((directory + name).c_str());
+        }
+        rmdir(directory.c_str());
+    }
+
+    static bool isDraftOf(std::string_view target, std::string_view name) {
+        constexpr std::size_t uuidLength = Wire::containerIdLength;
+        return name.size() == target.size() + 1 + uuidLength + draftSuffix.size() &&
+               name.substr(0, target.size()) == target && name[target.size()] == '.' &&
+               Wire::normalizeContainerId(name.substr(target.size() + 1, uuidLength)) &&
+               name.substr(name.size() - draftSuffix.size()) == draftSuffix;
+    }
+
+    static void removeAbandoned(std::string const &target) {
+        std::string const targetName = std::filesystem::path(target).filename().string();
+        std::error_code failed; // a directory that cannot be listed is told of by what comes next
+        std::filesystem::directory_iterator entry(directoryOf(target), failed);
+        for (; !failed && entry != std::filesystem::directory_iterator(); entry.increment(failed)) {
+            std::string const path = entry->path().string();
+            if (isDraftOf(targetName, entry->path().filename().string())) {
+                Wire::UniqueFd const lock(openDirectory(path));
+                if (lock && flock(lock.get(), LOCK_EX | LOCK_NB) == 0) {
+                    remove(path);
+                }
+            }
+        }
+    }
+
+    std::string directory_;
+    Wire::UniqueFd lock_;
 };
 
 /// Makes a name's change in its directory durable.
 void syncDirectoryOf(std::string const &path) {
-    auto directory = std::filesystem::path(path).parent_path();
-    if (directory.empty()) {
-        directory = ".";
-    }
-    int const file = open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    int const file = open(directoryOf(path).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     if (file < 0) {
         failMaking(path, errno);
     }

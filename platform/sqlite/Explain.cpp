@@ -14,15 +14,24 @@ std::string systemWords(int systemError, char const *otherwise) {
     return systemError == 0 ? std::string(otherwise) : std::generic_category().message(systemError);
 }
 
+Error diskFull(std::string const &name) {
+    return Error(ErrorKind::DiskFull, name + " cannot be written: the disk is full; it was not changed");
+}
+
 Error explainIo(int code, int systemError, char const *detail, std::string const &name) {
-    if (systemError == ENOSPC || systemError == EDQUOT) {
-        return Error(ErrorKind::DiskFull, name + " cannot be written: the disk is full; nothing was changed");
-    }
     if (code == SQLITE_IOERR_NOMEM) {
         throw std::bad_alloc();
     }
+    if (code == SQLITE_IOERR_DIR_FSYNC) {
+        // The journal is gone, so the change is there for everybody; only a power cut may still take it back.
+        return Error(ErrorKind::Io, name + " was changed, but perhaps not durably: " +
+                                        systemWords(systemError, "its directory cannot be synced"));
+    }
+    if (systemError == ENOSPC || systemError == EDQUOT) {
+        return diskFull(name);
+    }
     std::string action = " cannot be read or written: ";
-    if (code == SQLITE_IOERR_FSYNC || code == SQLITE_IOERR_DIR_FSYNC) {
+    if (code == SQLITE_IOERR_FSYNC) {
         action = " cannot be written durably: ";
     } else if (code == SQLITE_IOERR_READ || code == SQLITE_IOERR_SHORT_READ) {
         action = " cannot be read: ";
@@ -44,8 +53,7 @@ Error explain(int code, int systemError, char const *detail, std::string const &
         return Error(ErrorKind::Busy, busyTimeout.count() == 0
                                           ? name + " is busy: another process is changing it"
                                           : name + " is busy: another process has held its lock for " +
-                                                std::to_string(busyTimeout.count()) +
-                                                " ms; nothing was changed, try again");
+                                                std::to_string(busyTimeout.count()) + " ms");
     case SQLITE_CORRUPT:
     case SQLITE_NOTADB:
         return Error(ErrorKind::Malformed, name + " is damaged: " + detail);
@@ -54,7 +62,7 @@ Error explain(int code, int systemError, char const *detail, std::string const &
         return Error(ErrorKind::ReadOnly,
                      name + " cannot be written: it, its directory or its file system is read-only");
     case SQLITE_FULL:
-        return Error(ErrorKind::DiskFull, name + " cannot be written: the disk is full; nothing was changed");
+        return diskFull(name);
     case SQLITE_IOERR:
         return explainIo(code, systemError, detail, name);
     case SQLITE_CANTOPEN:

@@ -97,7 +97,8 @@ TEST_F(KilledWriters, fault_27_makeANewFileWholeOrNotAtAll) {
     writeBytes(at("new.json"), sampleTopology());
     std::filesystem::create_directory(at("work"));
     auto const array = at("work/test.array");
-    for (std::string const call : {"pwrite64", "fsync,fdatasync", "unlink", "rename", "link"}) {
+    for (std::string const call :
+         {"mkdir", "flock", "pwrite64", "fsync,fdatasync", "unlink", "rmdir", "rename", "link"}) {
         for (bool const replaces : {false, true}) {
             int kills = 0;
             for (int when = 1;; ++when) {
@@ -127,6 +128,8 @@ TEST_F(KilledWriters, fault_27_makeANewFileWholeOrNotAtAll) {
                 // Whatever lies around, the next attempt succeeds.
                 ASSERT_EQ(run({TOVI_ORKASIM, "make", "--force", at("new.json"), array}), 0) << where;
                 EXPECT_EQ(ArrayFile(array).counts().containers, 2) << where;
+                // And what the killed one left beside it is gone.
+                EXPECT_EQ(std::distance(std::filesystem::directory_iterator(at("work")), {}), 1) << where;
             }
             if (call == (replaces ? "rename" : "link")) {
                 EXPECT_EQ(kills, 1);
