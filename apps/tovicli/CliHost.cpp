@@ -32,9 +32,10 @@ CliEntry cliLibrary(std::string path) {
     };
 }
 
-CliHost::CliHost(Context &context, ErrorReport &report)
+CliHost::CliHost(Context &context, ErrorReport &report, bool isLine)
     : context_(context)
-    , report_(report) {}
+    , report_(report)
+    , isLine_(isLine) {}
 
 CliHost::~CliHost() = default;
 
@@ -125,6 +126,15 @@ void CliHost::restoreEnvironment() {
     put("TOVI_PLUGINS", settings_.pluginDirectory);
     put("TOVI_OFFLINE", offlineByUser_ ? std::optional<std::string>("1") : std::nullopt);
     put("TOVI_REQUEST_ID", settings_.requestId);
+}
+
+bool CliHost::isLine() const {
+    return isLine_;
+}
+
+ExitStatus CliHost::refuseLine(std::string const &sentence) {
+    report_.fail(sentence);
+    return ExitStatus::Usage;
 }
 
 void CliHost::endWith(ExitStatus status) {

@@ -23,7 +23,8 @@ CliEntry cliLibrary(std::string path);
 /// The namespace `cli` in one run of the tool.
 class CliHost final : public CliServices {
 public:
-    CliHost(Context &context, ErrorReport &report);
+    /// @param isLine the run is one that another one asked for
+    CliHost(Context &context, ErrorReport &report, bool isLine);
     ~CliHost() override;
     CliHost(CliHost const &) = delete;
     CliHost &operator=(CliHost const &) = delete;
@@ -51,6 +52,8 @@ public:
     void warn(std::string const &text) override;
     Plexa::Sink &output() override;
     ExitStatus runLine(std::vector<std::string> const &words) override;
+    bool isLine() const override;
+    ExitStatus refuseLine(std::string const &sentence) override;
     void endWith(ExitStatus status) override;
 
 private:
@@ -58,6 +61,7 @@ private:
 
     Context &context_;
     ErrorReport &report_;
+    bool const isLine_;
     Settings settings_;
     bool offlineByUser_ = false;
     /// The run owns the tree; this object is a part of the run.

@@ -39,6 +39,10 @@ public:
     /// Runs a command line in this process, under this run's settings where it has none of its own. The plug-ins of one
     /// run serve the next one too. What it has to say goes to standard output and standard error.
     virtual ExitStatus runLine(std::vector<std::string> const &words) = 0;
+    /// Whether this run is one of those itself.
+    virtual bool isLine() const = 0;
+    /// Tells that a line cannot be run at all. @return ExitStatus::Usage
+    virtual ExitStatus refuseLine(std::string const &sentence) = 0;
     /// What this run ends with, whatever its command leaves; the command has told why.
     virtual void endWith(ExitStatus status) = 0;
 };

@@ -6,8 +6,10 @@
 #include "Complete.h"
 #include "CompletionScript.h"
 #include "Describe.h"
+#include "Doctor.h"
 #include "PluginCheck.h"
 #include "PluginList.h"
+#include "Shell.h"
 
 using namespace Plexa;
 using namespace Tovicli::Cli;
@@ -41,6 +43,8 @@ void Tovicli_RegisterCli(boost::shared_ptr<AutoCli::NamespaceNode> const &cli, T
     cli->RegisterNamespaceNode(plugin, "plugin");
 
     cli->RegisterNamespaceNode(made<CompletionScript>(services), "completion");
+    cli->RegisterNamespaceNode(made<Doctor>(services), "doctor");
+    cli->RegisterNamespaceNode(made<Shell>(services), "shell");
     if (completing) { // nobody else's business
         cli->RegisterNamespaceNode(made<Complete>(services), "complete");
     }
