@@ -30,6 +30,13 @@ else()
   add_link_options($<$<STREQUAL:$<TARGET_PROPERTY:TYPE>,SHARED_LIBRARY>:-Wl,-z,defs>)
 endif()
 
+if(TOVI_COVERAGE)
+  # Four files a binary, which its processes take turns to add to.
+  set(profiles "${CMAKE_BINARY_DIR}/profiles/%4m.profraw")
+  add_compile_options(-fprofile-instr-generate=${profiles} -fcoverage-mapping)
+  add_link_options(-fprofile-instr-generate=${profiles})
+endif()
+
 add_library(tovi_warnings INTERFACE)
 target_compile_options(tovi_warnings INTERFACE -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Werror)
 # Two warnings of g++ 12's optimizer cry wolf: std::variant inside a KJ promise counts as uninitialized, and joining a
