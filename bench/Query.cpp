@@ -3,8 +3,8 @@
 // What the client library adds to the daemon's answer about all storage containers.
 //
 //   bench_query time ROUNDS   one line a round: nanoseconds through the library, nanoseconds for the raw bytes
-//   bench_query memory        one line: bytes of the records, bytes of heap they take, bytes the process grew at its
-//   peak
+//   bench_query memory        one line: bytes of the records, bytes of memory they take, bytes the process grew at its
+//                             peak
 //
 // Both on the daemon of TOVI_ROOT. The raw side asks the same daemon the same question and reads the same replies.
 #include <chrono>
@@ -84,11 +84,6 @@ size_t sizeOf(StorageContainerResult const &result) {
     return size;
 }
 
-size_t heapInUse() {
-    struct mallinfo2 const info = mallinfo2();
-    return info.uordblks + info.hblkhd;
-}
-
 /// A figure of /proc/self/status in bytes.
 size_t memoryFigure(std::string const &name) {
     std::ifstream status("/proc/self/status");
@@ -100,13 +95,18 @@ size_t memoryFigure(std::string const &name) {
     throw std::runtime_error("/proc/self/status does not tell " + name);
 }
 
+/// Resident memory, so that it does not matter where a library gets its own from. The first answer brings in code and
+/// whatever else is kept, and is given back.
 void printMemory() {
-    size_t const heapBefore = heapInUse();
+    LumoLib_FreeStorageContainerResult(query());
+    malloc_trim(0);
+    std::ofstream("/proc/self/clear_refs") << 5; // the peak begins anew
+    size_t const before = memoryFigure("RssAnon");
     size_t const residentBefore = memoryFigure("VmRSS");
     StorageContainerResult *const result = query();
-    size_t const heap = heapInUse() - heapBefore;
+    size_t const taken = memoryFigure("RssAnon") - before;
     size_t const peak = memoryFigure("VmHWM") - residentBefore;
-    std::printf("%zu %zu %zu\n", sizeOf(*result), heap, peak);
+    std::printf("%zu %zu %zu\n", sizeOf(*result), taken, peak);
     LumoLib_FreeStorageContainerResult(result);
 }
 

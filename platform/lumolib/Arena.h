@@ -11,7 +11,8 @@
 namespace LumoClient {
 
 /// Memory of one result: records and texts of any number in a few blocks, given back at once. Blocks grow with what is
-/// already there, by an eighth, so that little is ever left over (the standard's monotonic resource doubles).
+/// already there, by an eighth, so that little is ever left over (the standard's monotonic resource doubles); a large
+/// result lies in huge pages, the last of which is cut where the result ends.
 class Arena {
 public:
     Arena() = default;
@@ -49,11 +50,15 @@ public:
         return place;
     }
 
+    /// Gives back what is left of the last huge page. To be called when the result is complete.
+    void trim();
+
 private:
     void *allocateInNewBlock(std::size_t bytes, std::size_t alignment);
 
     struct Block {
         Block *previous;
+        std::size_t mappedBytes; // 0: from the heap
     };
 
     Block *newest_ = nullptr;

@@ -141,6 +141,7 @@ int32_t LumoLib_GetLumoMetadata(char const *containerId, char const *uuid, LumoM
                     end = &entry->next;
                 }
             });
+        owned->arena.trim();
         *metadata = owned.release();
     });
 }

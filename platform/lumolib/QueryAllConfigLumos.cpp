@@ -27,6 +27,7 @@ LumoQueryResult *lay(std::unique_ptr<Arena> arena, std::vector<LumoQueryEntry> c
         head->result.entries[place] = &records[place];
     }
     head->result.count = static_cast<std::int32_t>(entries.size());
+    arena->trim();
     head->arena = arena.release();
     return &head->result;
 }

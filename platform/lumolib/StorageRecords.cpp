@@ -31,6 +31,7 @@ void StorageRecords::finish(StorageContainerResult &result) {
         }
     }
     result.containerCount = static_cast<std::uint32_t>(count);
+    arena_.trim();
 }
 
 void StorageRecords::takeArrays(Compact::List<Compact::StorageArray>::Reader arrays) {
