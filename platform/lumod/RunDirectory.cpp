@@ -34,6 +34,22 @@ constexpr int backlog = 4096;
     throw Failure(ErrorCode::IoError, fmt::format("{} {}: {}", what, path, std::strerror(errno)));
 }
 
+/// Whoever may change a directory decides what the daemon's files in it are: that must be the daemon's own user or
+/// root.
+void requireTrusted(std::string const &path, struct stat const &status) {
+    if (status.st_uid != 0 && status.st_uid != ::geteuid()) {
+        throw Failure(ErrorCode::NotPermitted,
+                      fmt::format("the directory {} belongs to user {}, who is neither root nor the daemon's own user",
+                                  path, status.st_uid));
+    }
+    if ((status.st_mode & S_IWOTH) != 0) {
+        throw Failure(
+            ErrorCode::NotPermitted,
+            fmt::format("every user may write to the directory {} (mode {:04o}); the daemon needs one of its own", path,
+                        status.st_mode & 07777));
+    }
+}
+
 } // namespace
 
 RunDirectory::RunDirectory(Wire::Paths paths, std::optional<gid_t> group)
@@ -43,6 +59,11 @@ RunDirectory::RunDirectory(Wire::Paths paths, std::optional<gid_t> group)
     if (::mkdir(paths_.root().c_str(), rootMode) != 0 && errno != EEXIST) {
         fail("cannot make the root directory", paths_.root());
     }
+    struct stat status {};
+    if (::stat(paths_.root().empty() ? "/" : paths_.root().c_str(), &status) != 0) {
+        fail("cannot look at the root directory", paths_.root());
+    }
+    requireTrusted(paths_.root(), status);
     makeDirectory(paths_.run(), mode);
     makeDirectory(paths_.logs(), mode);
     lock();
@@ -69,6 +90,7 @@ void RunDirectory::makeDirectory(std::string const &path, mode_t mode) const {
         fail("cannot open the directory", path);
     }
     if (status.st_uid != ::geteuid()) {
+        requireTrusted(path, status);
         return; // prepared by an administrator, who decides who may enter it
     }
     if (group_ && status.st_gid != *group_ && ::fchown(directory.get(), static_cast<uid_t>(-1), *group_) != 0) {

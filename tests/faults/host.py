@@ -84,7 +84,10 @@ class Host:
         self.daemon = subprocess.Popen([*map(str, tracer), str(programs() / "lumod"), "--root", str(self.root)],
                                        env=self.environment, stdin=subprocess.DEVNULL, stdout=subprocess.PIPE,
                                        stderr=subprocess.DEVNULL)
-        return self.daemon.stdout.readline().startswith(b"lumod: ready")
+        if self.daemon.stdout.readline().startswith(b"lumod: ready"):
+            return True
+        self.buried()
+        return False
 
     def daemon_pid(self):
         return int((self.root / "run/lumod.pid").read_text())
@@ -94,7 +97,14 @@ class Host:
         if self.daemon is None:
             return None
         if self.daemon.poll() is None:
-            os.kill(self.daemon_pid(), signal.SIGTERM)
+            try:
+                os.kill(self.daemon_pid(), signal.SIGTERM)
+            except ProcessLookupError:
+                pass  # it ended by itself just now
+        return self.buried()
+
+    def buried(self):
+        """Waits for the daemon's end. @return its status"""
         status = self.daemon.wait(timeout=20)
         self.daemon.stdout.close()
         self.daemon = None

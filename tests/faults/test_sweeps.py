@@ -56,7 +56,8 @@ def array_only(before, after):
 
 
 def directory_only(before, after):
-    """A container whose directory is gone and whose record is not: it is mounted, and gets a directory when it needs one."""
+    """The record counts. A container whose directory alone is gone is mounted, and gets one when it needs one; a directory
+    without a record is nothing yet, and the next mount takes it over."""
     return {**before, "directories": after["directories"]}
 
 
@@ -68,7 +69,7 @@ COMMANDS = {
     "provider set": Command(registered, ["orkaprovider", "set", "--vp-name", "lab", "--arrayid", "array-north",
                                          "--priority", "7", "--isactive", "true"]),
     "provider remove": Command(registered, ["orkaprovider", "remove", "--vp-name", "lab"], "is registered"),
-    "container load": Command(one_container_less, ["storagecontainer", "load"]),
+    "container load": Command(one_container_less, ["storagecontainer", "load"], between=directory_only),
     "container remove": Command(mounted_containers, ["storagecontainer", "remove", "--container-id", ARCHIVE],
                                 "is not mounted", directory_only),
     "volume add": Command(mounted_containers, ["configlumo", "add", *VOLUME], "already"),

@@ -110,6 +110,56 @@ TEST_F(ServerTest, fault_29_ASecondDaemonLeavesTheFirstUndisturbed) {
     EXPECT_TRUE(std::filesystem::exists(paths_.pidFile()));
 }
 
+TEST_F(ServerTest, fault_58_ARootThatOthersCanChangeIsRefused) {
+    TempDirectory const other;
+    auto const sentenceFor = [&other] {
+        try {
+            Lumod::RunDirectory const refused(Wire::Paths(other.path()), std::nullopt);
+        } catch (Wire::Failure const &failure) {
+            EXPECT_EQ(failure.code(), ErrorCode::NotPermitted);
+            return failure.sentence();
+        }
+        return std::string();
+    };
+    ASSERT_EQ(::chmod(other.path().c_str(), 01777), 0);
+    EXPECT_EQ(sentenceFor(), "every user may write to the directory " + other.path() +
+                                 " (mode 1777); the daemon needs one of its own");
+    ASSERT_EQ(::chmod(other.path().c_str(), 0755), 0);
+    if (::geteuid() == 0) {
+        ASSERT_EQ(::chown(other.path().c_str(), 65534, static_cast<gid_t>(-1)), 0);
+        EXPECT_EQ(sentenceFor(), "the directory " + other.path() +
+                                     " belongs to user 65534, who is neither root nor the daemon's own user");
+        ASSERT_EQ(::chown(other.path().c_str(), 0, static_cast<gid_t>(-1)), 0);
+        std::filesystem::create_directory(other.path() + "/run");
+        ASSERT_EQ(::chown((other.path() + "/run").c_str(), 65534, static_cast<gid_t>(-1)), 0);
+        EXPECT_EQ(sentenceFor(), "the directory " + other.path() +
+                                     "/run belongs to user 65534, who is neither root nor the daemon's own user");
+        std::filesystem::remove(other.path() + "/run");
+    }
+    EXPECT_FALSE(std::filesystem::exists(other.path() + "/log"));
+    EXPECT_EQ(sentenceFor(), "");
+}
+
+TEST_F(ServerTest, fault_57_DirectoriesAndSocketsAreForTheirUsersOnly) {
+    TempDirectory const other;
+    auto const modeOf = [](std::string const &path) {
+        struct stat status {};
+        EXPECT_EQ(::stat(path.c_str(), &status), 0) << path;
+        return status.st_mode & 07777;
+    };
+    Wire::Paths const paths(other.path());
+    {
+        Lumod::RunDirectory runDirectory(paths, std::nullopt);
+        Wire::UniqueFd const socket = runDirectory.bindPrioritySocket();
+        EXPECT_EQ(modeOf(paths.run()), 0700U);
+        EXPECT_EQ(modeOf(paths.logs()), 0700U);
+        EXPECT_EQ(modeOf(paths.prioritySocket()), 0660U);
+        EXPECT_EQ(modeOf(paths.lockFile()), 0600U);
+    }
+    Lumod::RunDirectory const forGroup(paths, ::getegid());
+    EXPECT_EQ(modeOf(paths.run()), 0750U);
+}
+
 TEST_F(ServerTest, TheRunDirectoryCleansUpAfterItself) {
     server_.reset();
     runDirectory_.reset();

@@ -17,7 +17,8 @@ class RunDirectory {
 public:
     /// Makes the root and the two directories if need be, takes the lock and writes the pid file.
     /// @param group owns the directories, so that its members reach the sockets; nothing: only the owner does
-    /// @throws Wire::Failure InUse when another daemon holds the lock; IoError, naming the path
+    /// @throws Wire::Failure InUse when another daemon holds the lock; NotPermitted when somebody else than root and
+    /// the daemon's own user could change these directories; IoError, naming the path
     RunDirectory(Wire::Paths paths, std::optional<gid_t> group);
     /// Removes the pid file and the sockets that it bound. The lock file stays: removing it would let two processes
     /// lock two files of one name.
