@@ -5,6 +5,7 @@
 
 #include "gantry/Lib.h"
 #include "kestrel/Lib.h"
+#include "plexa/UsageError.h"
 #include "wire/ErrorCode.h"
 
 namespace Tovicli {
@@ -64,6 +65,9 @@ Outcome call(AutoCli::Command &command, boost::shared_ptr<CallSpec::Input> const
     } catch (Gantry::Lib::GantryException const &failure) {
         outcome.status = ExitStatus::Failed;
         outcome.message = failure.GetMessage();
+    } catch (UsageError const &mistake) { // which only the command itself could see
+        outcome.status = ExitStatus::Usage;
+        outcome.message = mistake.sentence();
     } catch (std::exception const &failure) {
         outcome.status = ExitStatus::Failed;
         outcome.message = failure.what();

@@ -20,10 +20,26 @@ std::string whatThereIs(std::vector<std::string> const &names) {
     return text;
 }
 
+/// Paths below a node that end in the word: the user may have left out what leads there.
+void findDeeper(AutoCli::NamespaceNode &node, std::string const &word, std::vector<std::string> &paths) {
+    constexpr std::size_t most = 3;
+    for (auto const &child : node.GetNamespaceNodes()) {
+        if (child->GetName() == word && paths.size() < most) {
+            paths.push_back(child->GetPathString(' '));
+        }
+        findDeeper(*child, word, paths);
+    }
+}
+
 std::string unknownWordSentence(AutoCli::NamespaceNode &node, std::string const &word) {
     std::string const path = node.GetPathString(' ');
     std::vector<std::string> const names = node.GetNamespaceNodeNames();
-    std::string const near = didYouMean(nearNames(word, names));
+    std::string near = didYouMean(nearNames(word, names));
+    if (near.empty()) {
+        std::vector<std::string> deeper;
+        findDeeper(node, word, deeper);
+        near = didYouMean(deeper);
+    }
     return "unknown word " + shownWord(word) + (path.empty() ? "" : " in '" + path + "'") +
            (near.empty() ? whatThereIs(names) : near);
 }
@@ -57,11 +73,18 @@ std::size_t walk(Node &node, std::vector<std::string> const &words, OptionParser
 }
 
 /// Reads what stands behind a command.
+/// @param positional the parameter that words without an option are values of; empty when they are mistakes
 void readOptions(std::vector<std::string> const &words, std::size_t position, CallSpec::InputSpec const &spec,
-                 OptionParser &own, OptionParser &globals) {
+                 std::string const &positional, OptionParser &own, OptionParser &globals) {
     while (position < words.size()) {
         if (!OptionParser::looksLikeOption(words[position])) {
-            throw UsageError(strayWordSentence(spec, words[position]));
+            if (positional.empty()) {
+                throw UsageError(strayWordSentence(spec, words[position]));
+            }
+            std::size_t first = 0;
+            own.take({"--" + positional + "=" + words[position]}, first);
+            ++position;
+            continue;
         }
         // An option that neither knows is reported with the names of the command, which are what was meant.
         bool const isGlobal = !own.knows(words[position]) && globals.knows(words[position]);
@@ -82,7 +105,7 @@ CommandLine readCommandLine(Node const &root, std::vector<std::string> const &wo
                 group.spec = CallSpec::InputSpec::New();
             }
             OptionParser own({group});
-            readOptions(words, position, *group.spec, own, globals);
+            readOptions(words, position, *group.spec, command->GetMetaDataField("positional"), own, globals);
             own.finish();
             if (!line.global->GetBool("help") && !line.global->GetBool("version")) {
                 OptionParser::requireAll(group);
@@ -97,7 +120,7 @@ CommandLine readCommandLine(Node const &root, std::vector<std::string> const &wo
 }
 
 FirstReading readAhead(std::vector<std::string> const &words) {
-    FirstReading reading{CallSpec::Input::New(), CallSpec::Input::New()};
+    FirstReading reading{CallSpec::Input::New(), CallSpec::Input::New(), 0};
     OptionParser certain({{globalOptions(), reading.certain}});
     OptionParser probable({{globalOptions(), reading.probable}});
     std::size_t position = 0;
@@ -107,6 +130,7 @@ FirstReading readAhead(std::vector<std::string> const &words) {
         probable.take(words, again);
     }
     certain.finish();
+    reading.pathAt = position;
     while (position < words.size()) {
         std::size_t const option = position;
         try {

@@ -36,6 +36,8 @@ struct FirstReading {
     boost::shared_ptr<Plexa::CallSpec::Input> certain;
     /// Those and what looks like global options behind it. A command may turn out to declare one of these names.
     boost::shared_ptr<Plexa::CallSpec::Input> probable;
+    /// Where the path begins; the end when there is none.
+    std::size_t pathAt = 0;
 };
 
 /// @throws Plexa::UsageError for a mistake before the first word of the path

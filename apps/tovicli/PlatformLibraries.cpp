@@ -17,7 +17,14 @@ constexpr char const *framework = "libplexa.so.1"; // linked to this program
 constexpr char const *daemonClient = "liblumo.so.1";
 constexpr char const *hostControl = "libkestrel.so.1"; // itself needs the daemon's client
 
-/// Which name of ours another version of a library is told from; null for a library that is not the platform's.
+extern "C" void passOn(void *context, LumoRequestTrace const *request) {
+    auto const &receiver = *static_cast<std::function<void(RequestDone const &)> *>(context);
+    receiver({request->method, request->requestId, request->socketPath, request->sentBytes, request->receivedBytes,
+              request->replies, request->code, std::chrono::microseconds(request->microseconds)});
+}
+
+} // namespace
+
 char const *ourVersionOf(std::string_view needed) {
     for (char const *ours : {framework, daemonClient, hostControl}) {
         std::string_view const unversioned(ours, std::string_view(ours).size() - 2);
@@ -28,14 +35,6 @@ char const *ourVersionOf(std::string_view needed) {
     }
     return nullptr;
 }
-
-extern "C" void passOn(void *context, LumoRequestTrace const *request) {
-    auto const &receiver = *static_cast<std::function<void(RequestDone const &)> *>(context);
-    receiver({request->method, request->requestId, request->socketPath, request->sentBytes, request->receivedBytes,
-              request->replies, request->code, std::chrono::microseconds(request->microseconds)});
-}
-
-} // namespace
 
 PlatformLibraries::PlatformLibraries(std::string directory)
     : directory_(std::move(directory)) {}

@@ -5,11 +5,15 @@
 #include <map>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "PluginSource.h"
 
 namespace Tovicli {
+
+/// Which name of ours another version of a library is told from; null for a library that is not the platform's.
+char const *ourVersionOf(std::string_view needed);
 
 /// The platform's libraries that plug-ins are built against. Their names carry the version of the binary interface.
 /// They are loaded before a plug-in that needs them, by path, so that the plug-in needs none; one that is already in

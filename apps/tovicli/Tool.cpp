@@ -76,12 +76,19 @@ private:
 
 } // namespace
 
-Tool::Tool(Context &context)
+Tool::Tool(Context &context, Tree tree)
     : context_(context)
     , report_(context.errors)
-    , trace_(context.errors, context.clock) {}
+    , trace_(context.errors, context.clock)
+    , cli_(context, report_, tree == Tree::Kept)
+    , tree_(tree) {}
+
+std::string Tool::versionText() {
+    return version;
+}
 
 ExitStatus Tool::run(std::vector<std::string> const &arguments) {
+    requestId_.clear(); // each run is a request of its own
     ExitStatus const status = runReported(arguments);
     report_.finish();
     if (trace_.isEnabled()) {
@@ -124,7 +131,8 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
         // May be a command's value of its own; the full reading decides.
     }
     offlineByUser_ = original.get("TOVI_OFFLINE").has_value();
-    Root root = grow(settings);
+    path_.assign(words.begin() + static_cast<std::ptrdiff_t>(reading.pathAt), words.end());
+    Root root = treeFor(settings);
     Misread mistake;
     CommandLine line = readCommandLine(root, words, mistake);
     Settings full = settings_;
@@ -133,7 +141,7 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
         if (!full.servesSamePlugins(settings_)) {
             // What looked like a global option was a value of the command's: begin again under the right settings.
             line = CommandLine();
-            root = grow(full);
+            root = treeFor(full);
             line = readCommandLine(root, words, mistake);
         }
     }
@@ -152,6 +160,22 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
     return command == nullptr || full.help ? showHelp(*line.node) : runCommand(*command, line);
 }
 
+Tool::Root Tool::treeFor(Settings const &settings) {
+    if (tree_ == Tree::Fresh || CliHost::isWanted(path_)) {
+        return grow(settings);
+    }
+    // Plug-ins that found no daemon are asked again: there may be one by now.
+    if (keptTree_ == nullptr || keptOffline_ || !settings.servesSamePlugins(keptFor_)) {
+        keptTree_ = grow(settings);
+        keptFor_ = settings;
+        keptOffline_ = registration_.daemonMissing;
+    } else {
+        apply(settings);
+        registration_ = Registration(); // whatever troubles there were have been told
+    }
+    return keptTree_;
+}
+
 Tool::Root Tool::grow(Settings const &settings) {
     apply(settings);
     if (!offlineByUser_) {
@@ -161,6 +185,14 @@ Tool::Root Tool::grow(Settings const &settings) {
     auto const storage = AutoCli::Namespace::New();
     storage->SetDescription("Storage commands.");
     root->RegisterNamespaceNode(storage, "storage");
+    std::string const trouble = cli_.hangInto(root, settings, offlineByUser_, path_);
+    if (CliHost::isWanted(path_)) {
+        registration_ = Registration();
+        if (!trouble.empty()) {
+            registration_.troubles.push_back(trouble);
+        }
+        return root;
+    }
     registration_ = context_.plugins.registerInto(root, settings.pluginDirectory, context_.environment);
     for (RegisteredPlugin const &plugin : registration_.plugins) {
         Trace::Event(trace_, "plugin")
@@ -280,8 +312,14 @@ ExitStatus Tool::runCommand(AutoCli::Command &command, CommandLine const &line) 
     FormatSettings const formatting = formatSettings(command, schema);
 
     Outcome const outcome = work(command, line);
+    if (cli_.status()) {
+        return written(*cli_.status(), {});
+    }
     std::string unheld; // why the format cannot hold the result
-    if (outcome.result != nullptr) {
+    auto const document = boost::dynamic_pointer_cast<MetaObj::MetaString>(outcome.result);
+    if (document != nullptr && command.GetMetaDataField("document") == "true") {
+        context_.output.write(document->GetValue()); // a text in a format of its own
+    } else if (outcome.result != nullptr) {
         CountingSink counted(context_.output);
         std::chrono::microseconds const began = trace_.isEnabled() ? trace_.elapsed() : std::chrono::microseconds(0);
         try {

@@ -11,6 +11,7 @@
 
 #include "Activity.h"
 #include "Call.h"
+#include "CliHost.h"
 #include "CommandLine.h"
 #include "ErrorReport.h"
 #include "ExitStatus.h"
@@ -39,13 +40,18 @@ struct Context {
     Activity *activity = nullptr;
     /// Time for traces; empty: the process's own.
     Trace::Clock clock = {};
+    /// Enters the library of the namespace `cli`; empty: there is no such namespace.
+    CliEntry cli = {};
     /// What the output is read on.
     Plexa::Display display = {};
 };
 
 class Tool {
 public:
-    explicit Tool(Context &context);
+    /// Whether the tree, and with it the plug-ins' sessions, is kept from one run to the next where it serves.
+    enum class Tree { Fresh, Kept };
+    explicit Tool(Context &context, Tree tree = Tree::Fresh);
+    static std::string versionText();
 
     /// @param arguments as main gets them, the program's name first
     ExitStatus run(std::vector<std::string> const &arguments);
@@ -72,6 +78,8 @@ private:
     void apply(Settings const &settings);
     /// A fresh tree with every plug-in's subtree under these settings.
     Root grow(Settings const &settings);
+    /// That of the run before where it is kept and serves these settings, a fresh one otherwise.
+    Root treeFor(Settings const &settings);
     Plexa::FormatSettings formatSettings(Plexa::AutoCli::Command &command,
                                          boost::shared_ptr<Plexa::MetaObj::MetaObject> const &schema) const;
     std::string socketPath() const;
@@ -86,6 +94,12 @@ private:
     Registration registration_;
     std::string requestId_;
     bool offlineByUser_ = false;
+    std::vector<std::string> path_; ///< words from the first one of the path on
+    CliHost cli_;
+    Tree const tree_;
+    Root keptTree_;
+    Settings keptFor_;
+    bool keptOffline_ = false;
 };
 
 } // namespace Tovicli

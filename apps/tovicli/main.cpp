@@ -99,14 +99,19 @@ int main(int argc, char **argv) {
     Tovicli::ProcessActivity activity(drawsLines(STDERR_FILENO), isatty(STDOUT_FILENO) == 1);
     std::string const installed = directoryAbove(programDirectory());
     Tovicli::DescriptorSink output(STDOUT_FILENO);
-    Tovicli::DescriptorSink errors(STDERR_FILENO);
+    Tovicli::DescriptorSink told(STDERR_FILENO);
+    Plexa::StringSink untold;
+    // A shell that completes a word has the user's line on the screen: nothing may be written into it.
+    bool const completing = argc > 2 && Tovicli::CliHost::isCompletion({argv[1], argv[2]});
+    Plexa::Sink &errors = completing ? static_cast<Plexa::Sink &>(untold) : told;
     Tovicli::ProcessEnvironment environment;
     Tovicli::PluginLoader plugins(installed + "/lib", geteuid());
     Tovicli::Context context{output,          errors,
                              environment,     plugins,
                              randomRequestId, {installed + "/lib/tovicli/plugins", workingDirectory()},
                              terminalWidth(), getauxval(AT_SECURE) != 0,
-                             &activity,       {}};
+                             &activity,       {},
+                             Tovicli::cliLibrary(installed + "/lib/tovicli/libtovicli-cli.so")};
     context.display = outputDisplay(environment);
     return static_cast<int>(Tovicli::Tool(context).run(std::vector<std::string>(argv, argv + argc)));
 }

@@ -125,7 +125,7 @@ ExitStatus Shell::runAll(LineSource &lines, bool keepGoing) {
         }
         first = first == ExitStatus::Completed ? status : first;
         if (!keepGoing || status == ExitStatus::Unwritten) {
-            services_.warn(where + " failed; what follows it was not run");
+            services_.warn("stopped at " + where + ", which failed");
             return first;
         }
     }

@@ -57,12 +57,16 @@ Loaded load(std::string const &file, PlatformLibraries &platform) {
         loaded.findings.push_back({"load", loaderText()});
         return loaded;
     }
+    std::set<std::string> missing;
     for (Symbol const &symbol : dynamicSymbols(descriptor)) {
         bool const mustBeThere = !symbol.defined && !symbol.weak;
         if (mustBeThere && dlsym(library, symbol.name.c_str()) == nullptr &&
             dlsym(RTLD_DEFAULT, symbol.name.c_str()) == nullptr) {
-            loaded.findings.push_back({"symbol", "nothing that it needs has the symbol " + symbol.name});
+            missing.insert(symbol.name);
         }
+    }
+    for (std::string const &name : missing) {
+        loaded.findings.push_back({"symbol", "nothing that it needs has the symbol " + name});
     }
     opened.keepForever();
     loaded.entry = reinterpret_cast<EntryPoint>(dlsym(library, "AutoCli_RegisterNamespaces"));
