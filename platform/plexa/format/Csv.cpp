@@ -72,7 +72,8 @@ public:
         } else if (typeOf(value) == ValueType::List) {
             Object const element = elementSchema(&as<MetaList>(value), schema);
             std::vector<Object> const &elements = as<MetaList>(value).ViewElements();
-            bool const isTable = kind == Kind::StructList && std::all_of(elements.begin(), elements.end(), isRow);
+            bool const isTable = std::all_of(elements.begin(), elements.end(), isRow) &&
+                                 (!elements.empty() || kind == Kind::StructList);
             isTable ? rows(elements, element.get()) : column(elements, element.get());
         } else {
             column({result.value}, schema);

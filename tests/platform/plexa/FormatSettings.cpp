@@ -46,12 +46,34 @@ TEST(FormatSettings, UserAssignmentsAreChecked) {
     }
 }
 
+TEST(FormatSettings, UserAssignmentsNameWhatTheResultDeclares) {
+    auto const schema = containersSchema();
+    FormatSettings made;
+    for (char const *right : {"fields:Container=Ready, Container Name", "fields:Array=ArrayId", "table-columns=Ready",
+                              "header:Array=%ArrayId% of 100%", "units:Container.Max Size=MB"}) {
+        EXPECT_EQ(mistakeOf([&] { made.setFromUser(right, schema); }), "no mistake") << right;
+    }
+    EXPECT_EQ(mistakeOf([&] { made.setFromUser("fields:Containr=Ready", schema); }),
+              "--format-param: 'Containr' is no structure of the result; did you mean 'Container'?; there is 'Array', "
+              "'Container'");
+    std::string const fields = "; there is 'Container Name', 'Max Size', 'Ready', 'Arrays'";
+    EXPECT_EQ(mistakeOf([&] { made.setFromUser("table-columns=Ready,ArrayId", schema); }),
+              "--format-param: 'ArrayId' is no field of 'Container'; did you mean 'Arrays'?" + fields);
+    EXPECT_EQ(mistakeOf([&] { made.setFromUser("header:Container=%Redy%", schema); }),
+              "--format-param: 'Redy' is no field of 'Container'; did you mean 'Ready'?" + fields);
+    EXPECT_EQ(mistakeOf([&] { made.setFromUser("units:Container.Size=MB", schema); }),
+              "--format-param: 'Size' is no field of 'Container'" + fields);
+    EXPECT_EQ(mistakeOf([&] { made.setFromUser("table-columns=x", MetaBool::New()); }),
+              "--format-param: the result of this command has no fields");
+}
+
 TEST(FormatSettings, ChosenFieldsMustBeDeclared) {
     FormatSettings made;
     EXPECT_EQ(mistakeOf([&] {
-                  made.chooseFields("S", "b,c", {"a", "b"});
+                  made.chooseFields("S", "Name,Nmae", {"Name", "Size"});
               }),
-              "--fields: 'c' is no field of the result; there is 'a', 'b'");
+              "--fields: 'Nmae' is no field of the result; did you mean 'Name'?; there is 'Name', 'Size'");
+    EXPECT_EQ(mistakeOf([&] { made.chooseFields("S", "a, b,a", {"a", "b"}); }), "--fields: 'a' is named twice");
     EXPECT_EQ(mistakeOf([&] { made.chooseFields("S", " , ", {"a"}); }), "--fields: no name given; there is 'a'");
     EXPECT_EQ(mistakeOf([&] { made.chooseFields("", "a", {}); }), "--fields: the result of this command has no fields");
     made.chooseFields("S", "b", {"a", "b"});
