@@ -64,29 +64,34 @@ void addToHost(Host &host, Store::FileSystem const &fileSystem, bool mount) {
 }
 
 void removeFromHost(Host &host, std::string const &containerId) {
-    auto const fileSystem = host.store.fileSystem(containerId);
-    if (!fileSystem) {
-        throw Wire::Failure(Wire::ErrorCode::NoSuchContainer,
-                            "the storage container " + containerId + " is not mounted on this host");
-    }
+    auto const requireRecord = [&] {
+        auto record = host.store.fileSystem(containerId);
+        if (!record) {
+            throw Wire::Failure(Wire::ErrorCode::NoSuchContainer,
+                                "the storage container " + containerId + " is not mounted on this host");
+        }
+        return *record;
+    };
+    requireRecord(); // before the directories' lock, which would make a host of what is none
     VolumeDirectories directories(host);
+    Store::FileSystem const fileSystem = requireRecord(); // another process may have removed it meanwhile
     directories.finishUnsettled();
     host.store.requireNoMounts(containerId);
     Directory const &volumes = host.places.volumes();
-    if (removeEmptyIn(volumes, fileSystem->name) == Outcome::InTheWay) {
-        bool const isDirectory = kindOf(volumes, fileSystem->name) == EntryKind::Directory;
+    if (removeEmptyIn(volumes, fileSystem.name) == Outcome::InTheWay) {
+        bool const isDirectory = kindOf(volumes, fileSystem.name) == EntryKind::Directory;
         throw Wire::Failure(
             Wire::ErrorCode::InUse,
-            "the storage container '" + fileSystem->name + "' is in use: its directory '" +
-                volumes.pathOf(fileSystem->name) +
-                (isDirectory ? "' is not empty, there is '" + anyEntryIn(openIn(volumes, fileSystem->name)) + "' in it"
+            "the storage container '" + fileSystem.name + "' is in use: its directory '" +
+                volumes.pathOf(fileSystem.name) +
+                (isDirectory ? "' is not empty, there is '" + anyEntryIn(openIn(volumes, fileSystem.name)) + "' in it"
                              : "' is no directory any more"));
     }
     try {
         host.store.removeFileSystem(containerId);
     } catch (Wire::Failure const &) {
-        if (isRecorded(host, *fileSystem, true)) {
-            makeIn(volumes, fileSystem->name, 0755);
+        if (isRecorded(host, fileSystem, true)) {
+            makeIn(volumes, fileSystem.name, 0755);
         }
         throw;
     }

@@ -7,6 +7,7 @@
 #include <capnp/serialize-async.h>
 #include <fmt/format.h>
 
+#include "Escape.h"
 #include "wire/Limits.h"
 
 namespace Lumod {
@@ -176,7 +177,7 @@ kj::Promise<void> Connection::sendFailure(uint64_t id, Failure const &failure) {
     reply.setId(id);
     auto builder = reply.initFailure();
     builder.setCode(static_cast<int32_t>(failure.code()));
-    builder.setSentence(failure.sentence().c_str());
+    builder.setSentence(onOneLine(failure.sentence()).c_str());
     return write(kj::mv(message));
 }
 

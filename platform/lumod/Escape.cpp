@@ -95,6 +95,27 @@ std::string escaped(std::string_view text) {
     return result;
 }
 
+std::string onOneLine(std::string_view text) {
+    std::string line;
+    line.reserve(text.size());
+    for (char const character : text) {
+        switch (character) {
+        case '\n':
+            line += "\\n";
+            break;
+        case '\r':
+            line += "\\r";
+            break;
+        case '\t':
+            line += "\\t";
+            break;
+        default:
+            line += character;
+        }
+    }
+    return line;
+}
+
 std::string repaired(std::string_view text) {
     std::string result;
     result.reserve(text.size());

@@ -16,6 +16,10 @@ bool hasControlCharacter(std::string_view text);
 /// their bytes, and a backslash is doubled, so that the line can be read back without doubt.
 std::string escaped(std::string_view text);
 
+/// A sentence that quotes names which users and arrays chose, on one line: breaks and tabs become \n, \r and \t. The
+/// rest is left to whoever shows it.
+std::string onOneLine(std::string_view text);
+
 /// A text for one JSON string: what is not UTF-8 becomes the replacement character.
 std::string repaired(std::string_view text);
 

@@ -75,6 +75,12 @@ TEST_F(ConfigVolumesTest, fault_53_WhatAProviderCallsItsVolumesIsCheckedToo) {
     EXPECT_TRUE(treeOf(at("volumes/gold")).empty());
 }
 
+TEST_F(ConfigVolumesTest, fault_64_ANameCannotBreakTheLineOfAMessage) {
+    std::string const message = messageOf([&] { mount("a/\ntovicli: b\tc"); });
+    EXPECT_NE(message.find("a/\\ntovicli: b\\tc"), std::string::npos) << message;
+    EXPECT_EQ(message.find_first_of("\n\t"), std::string::npos) << message;
+}
+
 TEST_F(ConfigVolumesTest, MountBindsAndMakesTheDirectoryAppear) {
     std::string const uuid = createVolume(*gold_, "dir");
     daemon_->takeRequests();

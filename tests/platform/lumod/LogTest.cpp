@@ -80,6 +80,10 @@ TEST(Log, ALongTraceIsCut) {
     EXPECT_LT(sink.text.size(), 200U);
 }
 
+TEST(Escape, fault_64_KeepsASentenceOnOneLine) {
+    EXPECT_EQ(Lumod::onOneLine("the volume 'a\nb\r\tc' \\ \x1b"), "the volume 'a\\nb\\r\\tc' \\ \x1b");
+}
+
 TEST(Escape, TellsUtf8FromOtherBytes) {
     for (char const *good : {"", "plain", "\xc3\xa4", "\xe2\x82\xac", "\xf0\x9f\x98\x80", "\xf4\x8f\xbf\xbf"}) {
         EXPECT_TRUE(Lumod::isUtf8(good)) << good;
