@@ -39,15 +39,15 @@ public:
         return new (allocate(count * sizeof(Record), alignof(Record))) Record[count]();
     }
 
-    /// A NUL-terminated copy.
+    /// @param text of a message, behind which there is a NUL
+    /// @return a copy, the NUL included
     char const *copy(std::string_view text) {
         if (text.empty()) {
             return "";
         }
-        char *const place = static_cast<char *>(allocate(text.size() + 1, 1));
-        std::memcpy(place, text.data(), text.size());
-        place[text.size()] = '\0';
-        return place;
+        void *const place = allocate(text.size() + 1, 1);
+        std::memcpy(place, text.data(), text.size() + 1);
+        return static_cast<char const *>(place);
     }
 
     /// Gives back what is left of the last huge page. To be called when the result is complete.

@@ -9,6 +9,7 @@
 
 #include <poll.h>
 #include <sys/socket.h>
+#include <sys/time.h>
 #include <sys/uio.h>
 
 #include <boost/system/error_code.hpp>
@@ -46,21 +47,37 @@ void waitFor(int socket, short events, Deadline deadline) {
     }
 }
 
+/// From now on a receive call ends when the deadline does, as far as the descriptor blocks at all.
+void limitReceiving(int socket, Deadline deadline) {
+    int const left = checkedRemainder(deadline);
+    timeval const limit{left / 1000, static_cast<suseconds_t>(left % 1000 * 1000)};
+    setsockopt(socket, SOL_SOCKET, SO_RCVTIMEO, &limit, sizeof limit);
+}
+
+/// Takes what is there, and waits inside the kernel for the rest: a long answer comes in many pieces, and being woken
+/// for each one would cost more than to take it.
 /// @return false when the peer closed the connection before the first byte
 bool receiveExactly(int socket, std::span<std::uint8_t> into, Deadline deadline) {
     std::size_t done = 0;
+    int flags = MSG_DONTWAIT;
     while (done < into.size()) {
-        ssize_t const got = recv(socket, into.data() + done, into.size() - done, MSG_DONTWAIT);
+        ssize_t const got = recv(socket, into.data() + done, into.size() - done, flags);
+        int const error = got < 0 ? errno : 0;
         if (got > 0) {
             done += static_cast<std::size_t>(got);
         } else if (got == 0 && done == 0) {
             return false;
         } else if (got == 0) {
             throw Failure(ErrorCode::ConnectionLost, "the peer closed the connection in the middle of a message");
-        } else if (errno == EAGAIN || errno == EWOULDBLOCK) {
-            waitFor(socket, POLLIN, deadline);
-        } else if (errno != EINTR) {
-            throwSocketError(errno, "receiving");
+        } else if (error != EINTR && error != EAGAIN && error != EWOULDBLOCK) {
+            throwSocketError(error, "receiving");
+        }
+        if (done < into.size()) {
+            if (flags == MSG_WAITALL && error == EAGAIN) {
+                waitFor(socket, POLLIN, deadline); // the descriptor does not block, or the time is over
+            }
+            limitReceiving(socket, deadline);
+            flags = MSG_WAITALL;
         }
     }
     return true;

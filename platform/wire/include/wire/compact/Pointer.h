@@ -122,9 +122,10 @@ public:
     constexpr std::uint32_t elementCount() const {
         return static_cast<std::uint32_t>(bits_ >> 35);
     }
-    /// Elements, when this is the tag of a composite list.
+    /// Elements, when this is the tag of a composite list. They have 29 bits, as in every list; the 30th counts
+    /// nowhere.
     constexpr std::uint32_t tagCount() const {
-        return static_cast<std::uint32_t>(bits_) >> 2;
+        return static_cast<std::uint32_t>(bits_) >> 2 & 0x1FFFFFFF;
     }
 
     /// Far: through a landing pad of two words, whose second one describes the target.
