@@ -12,7 +12,7 @@ import time
 import unittest
 
 import wire
-from host import TOP, Host, programs
+from host import GOLD, TOP, Host, programs
 
 LONG = bool(os.environ.get("TOVI_LONG"))
 MIB = 1 << 20
@@ -103,6 +103,19 @@ class Crowds(unittest.TestCase):
             # The last of those who left may not have been noticed yet.
             self.assertLessEqual(marks[-1][1], marks[0][1] + 2, marks)
             self.assertEqual(box.stop(), 0)
+
+    def test_fault_62_a_tool_without_descriptors(self):
+        with Host() as box:
+            self.serve(box)
+            box.done("storagecontainer", "load")
+            for limit in range(3, 24):
+                words = ["configlumo", "mount", "-n", "none", "-c", GOLD]
+                ended = box.run("prlimit", f"--nofile={limit}", programs() / "tovicli", "storage", "internal", "lumo", *words)
+                if "error while loading shared libraries" in ended.err:
+                    continue  # the system's own failure, before the tool's first instruction
+                self.assertIn(ended.status, (1, 3), f"{limit} descriptors: {ended}")
+                self.assertRegex(ended.err, r"\A(tovicli: [^\n]+\n)+\Z", f"{limit} descriptors")
+            self.assertIn("none", ended.err, "with so many it works")
 
     def answers(self, box, request, count, messages):
         client = wire.Client(box)

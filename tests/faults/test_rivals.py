@@ -2,7 +2,11 @@
 # SPDX-License-Identifier: Apache-2.0
 """Several tools that want the same thing at the same moment: it happens once, and whoever comes too late is told so."""
 
+import collections
+import ctypes
+import os
 import subprocess
+import threading
 import unittest
 
 from host import ARCHIVE, GOLD, Host, programs
@@ -97,6 +101,51 @@ class Fault59Rivals(unittest.TestCase):
                 else:
                     self.check(host, [], containers=2)
                     host.done("storagecontainer", "load")
+
+
+def exchange(one, other):
+    """Two names change places in one step."""
+    at_cwd, flag = -100, 2
+    libc = ctypes.CDLL(None, use_errno=True)
+    if libc.renameat2(at_cwd, os.fsencode(one), at_cwd, os.fsencode(other), flag) != 0:
+        raise OSError(ctypes.get_errno(), "renameat2")
+
+
+class Fault54LinkInThePath(unittest.TestCase):
+    def test_fault_54_a_link_raced_into_the_path(self):
+        """Somebody swaps a container's directory for a link to elsewhere, again and again, while tools work in it."""
+        with Host() as host:
+            self.assertTrue(host.start())
+            host.done("orkaprovider", "add", "--vp-name", "lab", "--vp-url", host.url)
+            host.done("storagecontainer", "load")
+            host.done("configlumo", "add", *VOLUME)
+            gold, link = host.root / "volumes/gold", host.root / "volumes/link"
+            outside = host.directory / "outside"
+            (outside / "vm").mkdir(parents=True)
+            (outside / "vm" / "file").write_text("precious")
+            link.symlink_to(outside)
+            ending = threading.Event()
+
+            def swap():
+                while not ending.is_set():
+                    exchange(gold, link)
+
+            swapper = threading.Thread(target=swap)
+            swapper.start()
+            statuses = collections.Counter()
+            try:
+                for _ in range(15):
+                    for command in ("mount", "umount", "remove", "add"):
+                        statuses[command, host.lumo("configlumo", command, *VOLUME).status] += 1
+            finally:
+                ending.set()
+                swapper.join()
+            self.assertEqual([str(p.relative_to(outside)) for p in sorted(outside.rglob("*"))], ["vm", "vm/file"])
+            self.assertEqual((outside / "vm/file").read_text(), "precious")
+            self.assertTrue({status for _, status in statuses} <= {0, 1}, statuses)
+            # The race was a race: some came through and some did not.
+            self.assertGreater(statuses["mount", 0], 0, statuses)
+            self.assertGreater(sum(n for (_, status), n in statuses.items() if status), 0, statuses)
 
 
 if __name__ == "__main__":

@@ -135,6 +135,34 @@ TEST_F(FaultTest, fault_46_AFullDiskRollsBackAndReadsGoOn) {
     EXPECT_EQ(countItems(database), 4);
 }
 
+/// Removes a file and then fails to sync its directory.
+int removeWithoutSync(sqlite3_vfs *, char const *name, int syncsDirectory) {
+    sqlite3_vfs *const real = sqlite3_vfs_find("unix");
+    int const result = real->xDelete(real, name, 0);
+    return result == SQLITE_OK && syncsDirectory != 0 ? SQLITE_IOERR_DIR_FSYNC : result;
+}
+
+TEST_F(FaultTest, fault_47_ADirectoryThatCannotBeSyncedIsNotCalledUnchanged) {
+    makeFile("a.db");
+    sqlite3_vfs *const real = sqlite3_vfs_find("unix");
+    sqlite3_vfs failing = *real;
+    failing.zName = "failing";
+    failing.xDelete = removeWithoutSync;
+    sqlite3_vfs_register(&failing, 1);
+    auto const error = errorOf([&] {
+        Database database(at("a.db"), kind(), Mode::ReadWrite);
+        database.query("INSERT INTO item (text) VALUES ('x')").run();
+    });
+    sqlite3_vfs_unregister(&failing);
+    sqlite3_vfs_register(real, 1);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::Io);
+    EXPECT_EQ(error->sentence().find("the test file '" + at("a.db") + "' was changed, but perhaps not durably: "), 0U)
+        << error->sentence();
+    Database database(at("a.db"), kind(), Mode::ReadWrite);
+    EXPECT_EQ(countItems(database), 2);
+}
+
 TEST_F(FaultTest, fault_50_AReadOnlyFileStillReads) {
     makeFile("a.db", 2);
     ASSERT_EQ(::chmod(at("a.db").c_str(), 0444), 0);
