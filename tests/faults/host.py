@@ -46,6 +46,7 @@ class Host:
         self.array = self.root / "arrays" / "small.array"
         self.url = f"file://{self.array}"
         self.daemon = None
+        self.status = None  # of a daemon that did not get ready
         self.environment = {k: v for k, v in os.environ.items() if k not in SETTINGS}
         self.environment["TOVI_ROOT"] = str(self.root)
         self.environment["TOVI_TIMEOUT_MS"] = "20000"
@@ -81,13 +82,18 @@ class Host:
 
     def start(self, *tracer):
         """Starts the daemon, perhaps under a tracer. @return whether it got ready"""
-        self.daemon = subprocess.Popen([*map(str, tracer), str(programs() / "lumod"), "--root", str(self.root)],
-                                       env=self.environment, stdin=subprocess.DEVNULL, stdout=subprocess.PIPE,
-                                       stderr=subprocess.DEVNULL)
+        with (self.directory / "daemon.err").open("wb") as err:
+            self.daemon = subprocess.Popen([*map(str, tracer), str(programs() / "lumod"), "--root", str(self.root)],
+                                           env=self.environment, stdin=subprocess.DEVNULL, stdout=subprocess.PIPE,
+                                           stderr=err)
         if self.daemon.stdout.readline().startswith(b"lumod: ready"):
             return True
-        self.buried()
+        self.status = self.buried()
         return False
+
+    def daemon_said(self):
+        """What the daemon that was started last has written to standard error."""
+        return (self.directory / "daemon.err").read_text(errors="replace")
 
     def daemon_pid(self):
         return int((self.root / "run/lumod.pid").read_text())

@@ -124,6 +124,28 @@ class DaemonSweep(unittest.TestCase):
             self.assertGreater(told, 10)
             print(f"{name}: {told} failures told")
 
+    def test_fault_47_refused_while_it_starts(self):
+        """It does not start, and says why in a line; or it can do without. Either way the next start works."""
+        with Host() as host:
+            log = host.directory / "trace"
+            self.assertTrue(host.start(*sweep.tracing(log)))
+            self.assertEqual(host.stop(), 0)
+            told = 0
+            for call in sweep.calls_of(log, [str(host.root), "<UNIX"]):
+                if call.name not in sweep.WRITING | sweep.ASKING | {"socket", "bind", "listen", "chmod"}:
+                    continue
+                where = f"EIO from lumod's {call.name} number {call.number}: {call.text}"
+                if host.start(*sweep.injecting(call, "error=EIO")):
+                    self.assertEqual(host.stop(), 0, where)
+                else:
+                    told += 1
+                    self.assertEqual(host.status, 1, where)
+                    self.assertRegex(host.daemon_said(), r"\Alumod: [^\n]+\n\Z", where)
+                self.assertTrue(host.start(), where)
+                self.assertEqual(host.stop(), 0, where)
+                self.assertEqual(host.strangers(), [], where)
+            self.assertGreater(told, 5)
+
     def test_fault_27_killed_while_it_creates(self):
         self.kill_everywhere("create")
 

@@ -2,6 +2,7 @@
 # SPDX-License-Identifier: Apache-2.0
 """The units of the service manager: they are well-formed, they confine the daemon, and the daemon can live with that."""
 
+import os
 import pathlib
 import re
 import shutil
@@ -55,6 +56,18 @@ class Units(unittest.TestCase):
         self.assertIn("pwrite64", used)
         # The service manager itself calls execve before the filter holds.
         self.assertEqual(sorted(used - allowed - {"execve"}), [])
+
+    @unittest.skipUnless(os.geteuid() == 0 and shutil.which("setpriv"), "only root has capabilities to lose")
+    def test_the_daemon_needs_no_capability(self):
+        with Host() as host:
+            self.assertTrue(host.start("setpriv", "--bounding-set=-all", "--inh-caps=-all", "--no-new-privs"))
+            held = (pathlib.Path("/proc") / str(host.daemon_pid()) / "status").read_text()
+            self.assertRegex(held, r"CapEff:\s0+\n")
+            host.done("orkaprovider", "add", "--vp-name", "lab", "--vp-url", host.url)
+            host.done("storagecontainer", "load")
+            host.done("configlumo", "add", "-n", "vm", "-c", GOLD)
+            host.done("configlumo", "mount", "-n", "vm", "-c", GOLD)
+            self.assertEqual(host.stop(), 0)
 
     def calls_allowed(self):
         """As the service's SystemCallFilter= lines add and take away."""
