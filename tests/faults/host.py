@@ -66,7 +66,8 @@ class Host:
         environment = {**self.environment, **settings}
         done = subprocess.run([str(w) for w in words], env=environment, stdin=stdin or subprocess.DEVNULL,
                               capture_output=True, check=False, timeout=120)
-        return Ended(words, done.returncode, done.stdout.decode(errors="replace"), done.stderr.decode(errors="replace"))
+        # Whatever goes in, what comes out is UTF-8.
+        return Ended(words, done.returncode, done.stdout.decode(), done.stderr.decode())
 
     def tool(self, *words, **settings):
         return self.run(programs() / "tovicli", *words, **settings)

@@ -136,6 +136,20 @@ class Fault64HostileText(unittest.TestCase):
         self.check_formats(["virtualvolume", "get", "-c", GOLD, "-u", uuid])
         self.check_formats(["virtualvolume", "metadata", "list", "-c", GOLD, "-u", uuid])
 
+    def test_fault_64_bytes_that_are_no_utf8(self):
+        # A byte of no character, a control sequence, a slash in too many bytes, half of a surrogate pair.
+        self.poison(["UPDATE storage_array SET name = CAST(X'66FF1B5B41C0AFEDA080' AS TEXT)",
+                     "UPDATE metadata SET value = CAST(X'66FF1B5B41C0AFEDA080' AS TEXT)"])
+        uuid = self.host.rows(self.host.array, "SELECT uuid FROM volume WHERE directory_name = 'web-01'")[0][0]
+        self.host.save()
+        shown = "f\\xff\x1b[A\\xc0\\xaf\\xed\\xa0\\x80"
+        for words in (["storagecontainer", "load"], ["virtualvolume", "metadata", "list", "-c", GOLD, "-u", uuid]):
+            self.assertIn(r"f\xff\x1b[A\xc0\xaf\xed\xa0\x80", self.formatted("simple", words).out)
+            self.assertIn(shown, self.texts(json.loads(self.formatted("json", words).out)))
+            for name in ("table", "tree", "keyvalue", "xml", "yaml", "csv"):
+                ended = self.formatted(name, words)  # which reads it as UTF-8
+                self.assertIn(ended.status, (0, 2), ended)
+
     def test_fault_64_names_and_ids_of_volumes(self):
         evil = "\x1b[31m\u202e" + "x" * 30
         self.poison(["UPDATE volume SET directory_name = ? WHERE directory_name = 'web-01'",
