@@ -105,6 +105,7 @@ CommandLine readCommandLine(Node const &root, std::vector<std::string> const &wo
                 group.spec = CallSpec::InputSpec::New();
             }
             OptionParser own({group});
+            own.alsoSuggest(globals);
             readOptions(words, position, *group.spec, command->GetMetaDataField("positional"), own, globals);
             own.finish();
             if (!line.global->GetBool("help") && !line.global->GetBool("version")) {

@@ -28,15 +28,13 @@ struct ExitMeaning {
     char const *meaning;
 };
 
-constexpr std::array<ExitMeaning, 8> exitMeanings{{
+constexpr std::array<ExitMeaning, 6> exitMeanings{{
     {"0", "completed"},
     {"1", "the command reported a failure: output left incomplete, a false result, a message"},
     {"2", "usage: a mistake in the command line; nothing was done"},
     {"3", "the daemon or a plug-in is not to be had, or did not answer in time"},
     {"4", "the output could not be written; the work may have been done"},
-    {"129", "ended by SIGHUP; part of the work may have been done"},
-    {"130", "interrupted (SIGINT, Ctrl-C); part of the work may have been done"},
-    {"143", "ended by SIGTERM; part of the work may have been done"},
+    {"128+n", "ended by signal n (129 SIGHUP, 130 SIGINT or Ctrl-C, 143 SIGTERM); part of the work may have been done"},
 }};
 
 } // namespace Tovicli

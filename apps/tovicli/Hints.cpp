@@ -23,7 +23,7 @@ std::string hintFor(int32_t code, std::string const &root, std::string const &re
     case Wire::ErrorCode::ShuttingDown:
         return "try again when lumod is running again";
     case Wire::ErrorCode::ProviderOffline:
-        return "'orkaprovider injectfault --status default' takes an injected state back";
+        return "'orkaprovider injectfault' without --status takes an injected state back";
     case Wire::ErrorCode::NoActiveProvider:
         return "'orkaprovider activate' makes a provider the array's active one";
     case Wire::ErrorCode::FileForeign:

@@ -140,7 +140,7 @@ boost::shared_ptr<CallSpec::InputSpec> globalOptions() {
                 ". Default: TOVI_FORMAT, else what the command names, else simple.");
     declare(*spec, "format-param", CallSpec::StringList,
             "A setting of the format as key=value, added to or in place of the command's own: fields:<structure>, "
-            "header:<structure>, table-columns, units:<structure>.<field>. May be repeated.");
+            "header:<structure>, table-columns, units:<structure>.<field>.");
     declare(*spec, "fields", CallSpec::String, "Fields of the result to print, separated by commas, in this order.");
     declare(*spec, "root", CallSpec::String, "The host's directory. Default: TOVI_ROOT, else /var/lib/tovi.");
     declare(*spec, "timeout", CallSpec::String,

@@ -3,10 +3,10 @@
 
 #include <exception>
 
+#include "Help.h"
 #include "Hints.h"
 
 #include "plexa/Text.h"
-#include "plexa/TreeHelp.h"
 #include "plexa/UsageError.h"
 #include "wire/ErrorCode.h"
 
@@ -166,6 +166,7 @@ Tool::Root Tool::treeFor(Settings const &settings) {
     }
     // Plug-ins that found no daemon are asked again: there may be one by now.
     if (keptTree_ == nullptr || keptOffline_ || !settings.servesSamePlugins(keptFor_)) {
+        keptTree_.reset(); // with the sessions that it holds
         keptTree_ = grow(settings);
         keptFor_ = settings;
         keptOffline_ = registration_.daemonMissing;
@@ -290,15 +291,7 @@ ExitStatus Tool::showHelp(AutoCli::NamespaceNode &node) {
     if (registration_.daemonMissing) {
         report_.warn(daemonSentence());
     }
-    auto *const command = dynamic_cast<AutoCli::Command *>(&node);
-    std::string help = command != nullptr ? commandHelpText(*command, program, context_.width)
-                                          : namespaceHelp(node, program, context_.width);
-    if (node.GetParent() == nullptr) {
-        help += globalOptionsHelp(*globalOptions(), context_.width);
-    } else {
-        help += std::string("\nGlobal options: ") + program + " --help\n";
-    }
-    context_.output.write(escaped(help, Lines::Keep));
+    context_.output.write(escaped(helpOf(node, program, context_.width), Lines::Keep));
     return written(ExitStatus::Completed, {});
 }
 
@@ -335,8 +328,7 @@ ExitStatus Tool::runCommand(AutoCli::Command &command, CommandLine const &line) 
         }
     }
     tell(outcome);
-    std::string const whatWasDone =
-        outcome.status == ExitStatus::Completed ? "; the command itself was completed" : "";
+    std::string const whatWasDone = outcome.status == ExitStatus::Completed ? "; the command itself was completed" : "";
     if (!unheld.empty()) {
         report_.fail(unheld + whatWasDone);
         return ExitStatus::Unwritten;

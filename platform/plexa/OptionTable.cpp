@@ -36,4 +36,16 @@ void appendOptionTable(std::string &to, std::vector<OptionRow> const &rows, std:
     }
 }
 
+void appendDeclaredOptions(std::string &to, std::vector<DeclaredOption> const &options, std::size_t width) {
+    std::vector<OptionRow> rows;
+    for (DeclaredOption const &option : options) {
+        std::string text = option.notes() + option.description;
+        if (option.description.empty() && !text.empty()) {
+            text.pop_back(); // the blank behind the last note
+        }
+        rows.push_back({(option.alias.empty() ? "    " : option.alias + ", ") + option.form(), text});
+    }
+    appendOptionTable(to, rows, width);
+}
+
 } // namespace Plexa

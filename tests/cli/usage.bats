@@ -25,6 +25,18 @@ setup() {
     expect_failure 2 "storagecontaner" "storagecontainer"
 }
 
+@test "a word from further down is shown its path" {
+    tovi lumo storagecontainer load
+    expect_failure 2 "unknown word 'lumo'; did you mean 'storage internal lumo'?"
+    tovi storage checklumos --path x
+    expect_failure 2 "'storage internal lumo storagecontainer checklumos'"
+}
+
+@test "a global option behind a command is offered too" {
+    lumo storagecontainer load --fromat json
+    expect_failure 2 "did you mean '--format'?"
+}
+
 @test "a number that is none: parameter, value, what is expected" {
     lumo orkaprovider add --vp-name lab --vp-url u --arrayid a --priority many --isactive true
     expect_failure 2 "priority" "many" "whole number"

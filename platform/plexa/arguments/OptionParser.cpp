@@ -70,6 +70,12 @@ OptionParser::OptionParser(std::vector<Group> groups) {
     }
 }
 
+void OptionParser::alsoSuggest(OptionParser const &other) {
+    for (Target const &target : other.targets_) {
+        otherNames_.push_back(target.parameter->GetName());
+    }
+}
+
 bool OptionParser::looksLikeOption(std::string const &word) {
     return word.size() > 1 && word[0] == '-';
 }
@@ -190,6 +196,7 @@ void OptionParser::failUnknown(std::string const &option) const {
     for (Target const &target : targets_) {
         names.push_back(target.parameter->GetName());
     }
+    names.insert(names.end(), otherNames_.begin(), otherNames_.end());
     std::string const bare = option.substr(std::min(option.find_first_not_of('-'), option.size()));
     std::vector<std::string> near = nearNames(bare, names);
     for (std::string &name : near) {

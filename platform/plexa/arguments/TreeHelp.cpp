@@ -48,14 +48,8 @@ std::string commandHelpText(AutoCli::Command &command, std::string const &progra
 }
 
 std::string globalOptionsHelp(CallSpec::InputSpec const &options, std::size_t width) {
-    std::vector<OptionRow> rows;
-    for (auto const &option : options.GetParameters()) {
-        std::string const alias = option->GetAlias().empty() ? "    " : "-" + option->GetAlias() + ", ";
-        bool const isFlag = option->GetType() == CallSpec::Flag;
-        rows.push_back({alias + "--" + option->GetName() + (isFlag ? "" : " VALUE"), option->GetDescription()});
-    }
     std::string help = "\nGlobal options:\n";
-    appendOptionTable(help, rows, width);
+    appendDeclaredOptions(help, declaredOptions(options), width);
     return help;
 }
 

@@ -54,12 +54,57 @@ TEST(Help, CommandTellsTheFieldsOfItsResult) {
                                                         "\n"
                                                         "Two  blanks stay.\n"
                                                         "\n"
-                                                        "Fields of each element of the result:\n"
-                                                        "  Container Name, Arrays (ArrayId)\n"
+                                                        "Result: a list, each element with the fields:\n"
+                                                        "  Container Name  text\n"
+                                                        "  Arrays          list, each element with:\n"
+                                                        "    ArrayId       text\n"
                                                         "\n"
                                                         "Examples:\n"
-                                                        "  tovicli load\n"
-                                                        "      Loads all.\n");
+                                                        "  Loads all.\n"
+                                                        "      tovicli load\n");
+}
+
+TEST(Help, ResultTellsKindsAndUnits) {
+    auto const structure = MetaObj::MetaStruct::New("Volume");
+    structure->SetField("Name", MetaObj::MetaString::New());
+    structure->SetField("Size", MetaObj::MetaInt::New());
+    structure->SetField("Ready", MetaObj::MetaBool::New());
+    structure->SetField("Tags", MetaObj::MetaList::New(MetaObj::StringList));
+    auto const command = SampleCommand::New();
+    command->output->SetOutputType(structure);
+    command->SetDefaultOutputParameter("units:Volume.Size", "MB");
+    EXPECT_NE(commandHelpText(*command, "tovicli", 80)
+                  .find("Result: a structure with the fields:\n"
+                        "  Name   text\n"
+                        "  Size   whole number, MB\n"
+                        "  Ready  true or false\n"
+                        "  Tags   list of texts\n"),
+              std::string::npos);
+    command->output->SetOutputType(MetaObj::MetaBool::New());
+    EXPECT_NE(commandHelpText(*command, "tovicli", 80).find("\nResult: true or false\n"), std::string::npos);
+    command->output->SetOutputType(nullptr);
+    EXPECT_EQ(commandHelpText(*command, "tovicli", 80).find("Result"), std::string::npos);
+}
+
+TEST(Help, UsageIsBrokenBetweenOptionsOnly) {
+    auto const command = SampleCommand::New();
+    command->parameter("name", CallSpec::String)->SetRequired(true);
+    command->parameter("size", CallSpec::Int)->SetRequired(true);
+    command->parameter("word", CallSpec::StringList);
+    command->SetMetaDataField("positional", "word");
+    auto const root = AutoCli::Namespace::New();
+    root->RegisterNamespaceNode(command, "add");
+    EXPECT_EQ(commandHelpText(*command, "tovicli", 27), "Usage:\n"
+                                                        "  tovicli add --name TEXT\n"
+                                                        "      --size NUMBER\n"
+                                                        "      [TEXT...]\n"
+                                                        "\n"
+                                                        "Options:\n"
+                                                        "      --name TEXT    Required.\n"
+                                                        "      --size NUMBER  Required.\n"
+                                                        "      --word TEXT    May be repeated. The\n"
+                                                        "                     name may be left\n"
+                                                        "                     out.\n");
 }
 
 TEST(Help, GeneratedWithoutSettingsHasDefaults) {

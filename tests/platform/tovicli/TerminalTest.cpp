@@ -22,6 +22,8 @@ using ::testing::HasSubstr;
 using ::testing::MatchesRegex;
 using ::testing::Not;
 
+/// What is drawn comes five times a second.
+constexpr int mostReads = 300;
 constexpr char const *erased = "\r\x1b[K";
 
 /// A command that works until the test lets it end, its standard streams on a terminal of the test's.
@@ -36,7 +38,9 @@ protected:
             kill(child_, SIGKILL);
             waitpid(child_, nullptr, 0);
         }
-        close(terminal_);
+        if (terminal_ >= 0) {
+            close(terminal_);
+        }
     }
 
     struct Settings {
@@ -71,7 +75,7 @@ protected:
 
     /// Reads what the terminal shows until it holds the text.
     void awaitText(std::string const &text) {
-        while (shown.find(text) == std::string::npos && readMore(10'000)) {
+        for (int reads = 0; reads < mostReads && shown.find(text) == std::string::npos && readMore(10'000); ++reads) {
         }
         EXPECT_THAT(shown, HasSubstr(text));
     }
@@ -90,10 +94,19 @@ protected:
     }
     /// @return the exit status, or minus the signal that ended it
     int status() {
-        while (readMore(10'000)) {
+        int reads = 0;
+        while (reads < mostReads && readMore(10'000)) {
+            ++reads;
+        }
+        EXPECT_LT(reads, mostReads) << "it does not end";
+        if (reads == mostReads) {
+            kill(child_, SIGKILL);
         }
         int status = 0;
         waitpid(child_, &status, 0);
+        child_ = -1;
+        close(terminal_);
+        terminal_ = -1;
         return WIFEXITED(status) ? WEXITSTATUS(status) : -WTERMSIG(status);
     }
     pid_t child() const {
@@ -121,7 +134,7 @@ private:
 
 TEST_F(Terminal, LongWorkIsShownAndGoneBeforeTheResult) {
     start({});
-    awaitText("\rtovicli: working, 0.5 s\x1b[K");
+    awaitText("\rtovicli: working, ");
     awaitText(" s\x1b[K\r");
     letEnd();
     EXPECT_EQ(status(), 0);

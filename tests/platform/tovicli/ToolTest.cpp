@@ -97,7 +97,7 @@ TEST(Tool, FormatIsChosenByOptionBeforeVariableBeforeCommand) {
     harness.environment.values["TOVI_FORMAT"] = "nonsense";
     EXPECT_EQ(harness.run({"storage", "sample"}), 2);
     EXPECT_THAT(harness.errors,
-                StartsWith("tovicli: TOVI_FORMAT: unknown format 'nonsense'; there is simple, table, json"));
+                StartsWith("tovicli: TOVI_FORMAT: unknown format 'nonsense'; there is simple, table, "));
 }
 
 TEST(Tool, FormatParametersOfTheUserReplaceTheCommands) {

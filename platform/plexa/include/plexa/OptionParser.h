@@ -31,6 +31,9 @@ public:
     /// Whether a word is written like an option.
     static bool looksLikeOption(std::string const &word);
 
+    /// Names that an unknown option is compared with too: those of another parser that reads the same words.
+    void alsoSuggest(OptionParser const &other);
+
     /// Whether one of the groups declares the option that the word names.
     bool knows(std::string const &word) const;
 
@@ -62,6 +65,7 @@ private:
     [[noreturn]] void failUnknown(std::string const &option) const;
 
     std::vector<Target> targets_;
+    std::vector<std::string> otherNames_;
 };
 
 } // namespace Plexa
