@@ -224,8 +224,17 @@ void Database::giveBack(Statement statement) noexcept {
 }
 
 void Database::fail(SQLite::Exception const &cause) const {
-    throw explain(cause.getExtendedErrorCode(), sqlite3_system_errno(handle_->getHandle()), cause.what(),
-                  named(identity_.kindName, path_), busyTimeout_);
+    int const systemError = sqlite3_system_errno(handle_->getHandle());
+    std::string const name = named(identity_.kindName, path_);
+    if (cause.getErrorCode() == SQLITE_CANTOPEN && whyNotOpen(path_) == 0) {
+        // The file is open; it is its journal that cannot be. SQLite has tried to read one then, so that its error says
+        // that there is none.
+        if (!mayMakeFileBeside(path_)) {
+            throw explain(SQLITE_READONLY, systemError, cause.what(), name, busyTimeout_);
+        }
+        throw Error(ErrorKind::Io, name + " cannot be written: its journal cannot be made");
+    }
+    throw explain(cause.getExtendedErrorCode(), systemError, cause.what(), name, busyTimeout_);
 }
 
 } // namespace Sqlite
