@@ -21,7 +21,8 @@ set(CMAKE_ARCHIVE_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/archive)
 set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
 set(TOVI_PLUGIN_DIRECTORY ${CMAKE_BINARY_DIR}/lib/tovicli/plugins)
 
-add_link_options(-Wl,--as-needed -Wl,-O1)
+# Code and what is only read share a segment: two mappings and page faults less for each library that a command loads.
+add_link_options(-Wl,--as-needed -Wl,-O1 -Wl,-z,noseparate-code)
 if(TOVI_SANITIZE)
   add_compile_options(-fsanitize=${TOVI_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
   add_link_options(-fsanitize=${TOVI_SANITIZE})

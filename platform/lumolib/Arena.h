@@ -39,6 +39,13 @@ public:
         return new (allocate(count * sizeof(Record), alignof(Record))) Record[count]();
     }
 
+    /// The same for records that the caller is going to assign, each of them.
+    template <typename Record>
+    Record *unsetRecords(std::size_t count) {
+        static_assert(std::is_trivially_destructible_v<Record> && std::is_trivially_copyable_v<Record>);
+        return static_cast<Record *>(allocate(count * sizeof(Record), alignof(Record)));
+    }
+
     /// @param text of a message, behind which there is a NUL
     /// @return a copy, the NUL included
     char const *copy(std::string_view text) {

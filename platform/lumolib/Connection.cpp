@@ -75,6 +75,10 @@ Connection::Connection(std::string socketPath, Settings const &settings)
     , requestId_(settings.requestId)
     , offline_(settings.offline) {}
 
+bool Connection::serves(std::string const &socketPath, Settings const &settings) const {
+    return socketPath_ == socketPath && timeout_ == settings.timeout && offline_ == settings.offline;
+}
+
 Wire::Deadline Connection::deadline() const {
     return std::chrono::steady_clock::now() + timeout_;
 }

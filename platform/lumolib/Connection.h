@@ -31,6 +31,9 @@ public:
 
     Connection(std::string socketPath, Settings const &settings);
 
+    /// Whether it would do for a session that is opened now: the same daemon, as long to wait, offline or not.
+    bool serves(std::string const &socketPath, Settings const &settings) const;
+
     /// The moment at which a request that begins now has failed.
     Wire::Deadline deadline() const;
 

@@ -47,13 +47,14 @@ Connection &openSession() {
     return *session;
 }
 
-/// Nested opens share one connection, and each one tells whether a daemon is there. Should the tool go offline while
-/// somebody's session is still open, that session goes with it.
+/// Nested opens share one connection, and each one tells whether a daemon is there. Should the tool have gone to
+/// another root, offline or back while somebody's session is still open, that session goes with it.
 void open() {
     Settings const settings = Settings::fromEnvironment();
+    std::string const socketPath = Wire::Paths(settings.root).orderedSocket();
     std::unique_ptr<Connection> fresh;
-    if (session == nullptr || settings.offline) {
-        fresh = std::make_unique<Connection>(Wire::Paths(settings.root).orderedSocket(), settings);
+    if (session == nullptr || !session->serves(socketPath, settings)) {
+        fresh = std::make_unique<Connection>(socketPath, settings);
     }
     Connection &connection = fresh ? *fresh : *session;
     if (!settings.offline) {

@@ -23,7 +23,7 @@ void StorageRecords::finish(StorageContainerResult &result) {
     for (Chunk const &chunk : chunks_) {
         count += chunk.count;
     }
-    result.containers = arena_.records<StorageContainerInfo *>(count);
+    result.containers = arena_.unsetRecords<StorageContainerInfo *>(count);
     StorageContainerInfo **next = result.containers;
     for (Chunk const &chunk : chunks_) {
         for (std::size_t place = 0; place < chunk.count; ++place) {
@@ -46,7 +46,7 @@ void StorageRecords::takeArrays(Compact::List<Compact::StorageArray>::Reader arr
 
 void StorageRecords::takeContainers(Compact::List<Compact::StorageContainer>::Reader containers) {
     connection_.requireChunk(containers.size());
-    Chunk const chunk{arena_.records<StorageContainerInfo>(containers.size()), containers.size()};
+    Chunk const chunk{arena_.unsetRecords<StorageContainerInfo>(containers.size()), containers.size()};
     StorageContainerInfo *record = chunk.first;
     for (Compact::StorageContainer::Reader const container : containers) {
         fillContainer(*record++, container);
@@ -87,6 +87,7 @@ void StorageRecords::fillEndpoint(ProtocolEndpointInfo &record, Compact::Endpoin
 
 void StorageRecords::fillContainer(StorageContainerInfo &record, Compact::StorageContainer::Reader container) {
     Compact::List<std::uint32_t>::Reader const places = container.getArrays();
+    record = StorageContainerInfo{};
     record.id = arena_.copy(container.getId());
     record.name = arena_.copy(container.getName());
     record.providerUrl = providerUrl(container.getProviderUrl());

@@ -113,6 +113,29 @@ TEST_F(Session, going_offline_takes_an_open_session_along) {
     EXPECT_EQ(LumoLib_DeactivateProvider("a", "p"), code(ErrorCode::DaemonNotRunning));
 }
 
+TEST_F(Session, coming_back_online_takes_an_open_session_along) {
+    set("TOVI_OFFLINE", "1");
+    FakeDaemon daemon(socket(), answerDone);
+    ASSERT_TRUE(LumoLib_Init(0, 0));
+    EXPECT_EQ(LumoLib_DeactivateProvider("a", "p"), code(ErrorCode::DaemonNotRunning));
+    set("TOVI_OFFLINE", "");
+    EXPECT_TRUE(LumoLib_Init(0, 0));
+    EXPECT_TRUE(ask());
+    EXPECT_EQ(daemon.connections(), 1);
+}
+
+TEST_F(Session, another_root_takes_an_open_session_along) {
+    FakeDaemon daemon(socket(), answerDone);
+    ASSERT_TRUE(LumoLib_Init(0, 0));
+    set("TOVI_ROOT", "/nonexistent");
+    EXPECT_FALSE(LumoLib_Init(0, 0));
+    EXPECT_TRUE(ask()); // what is open stays when the other one cannot be had
+    set("TOVI_OFFLINE", "1");
+    EXPECT_TRUE(LumoLib_Init(0, 0));
+    EXPECT_EQ(LumoLib_DeactivateProvider("a", "p"), code(ErrorCode::DaemonNotRunning));
+    EXPECT_EQ(lastFailure(), "10: no daemon answers at /nonexistent/run/lumod.sock");
+}
+
 TEST_F(Session, container_ids_need_none) {
     char buffer[37];
     ASSERT_TRUE(LumoLib_NormalizeContainerIdString("{0A1B2C3D4E5F60718293A4B5C6D7E8F9}", buffer));

@@ -49,10 +49,50 @@ inline std::string_view readText(Segment const &segment, Word const *place) {
     return std::string_view(reinterpret_cast<char const *>(bytes.data()), bytes.size() - 1);
 }
 
+/// The list of structures that a pointer leads to. Whoever expects texts or numbers gets the first pointer or number of
+/// each.
+/// @throw Malformed
+ListPlace compositeList(Target const &target, ElementSize expected, int nesting);
+
 /// A list whose pointer is not null.
 /// @param expected what the caller's elements are; what is read may be larger, or structures that begin with it
 /// @throw Malformed
-ListPlace readList(Segment const &segment, Word const *place, Pointer pointer, ElementSize expected, int nesting);
+inline ListPlace readList(Segment const &segment, Word const *place, Pointer pointer, ElementSize expected,
+                          int nesting) {
+    if (nesting <= 0) {
+        malformed("it nests too deeply");
+    }
+    Target const target = followed(segment, place, pointer);
+    if (target.pointer.kind() != Pointer::List) {
+        malformed("a list is something else");
+    }
+    ElementSize const size = target.pointer.elementSize();
+    if (size == ElementSize::Composite) {
+        return compositeList(target, expected, nesting);
+    }
+    if (size == ElementSize::Bit) {
+        malformed("a list is one of bits");
+    }
+    std::uint32_t const count = target.pointer.elementCount();
+    std::uint32_t const bytes = bytesOfElement(size);
+    target.segment->require(target.words, (std::uint64_t{count} * bytes + bytesPerWord - 1) / bytesPerWord);
+    if (size == ElementSize::Void) {
+        target.segment->visits->count(count); // any number of them fits into no room at all
+    }
+    bool const pointers = size == ElementSize::Pointer;
+    bool const fits = expected == ElementSize::Composite ||
+                      (expected == ElementSize::Pointer ? pointers : !pointers && bytesOfElement(expected) <= bytes);
+    if (!fits) {
+        malformed("a list has smaller elements");
+    }
+    return {target.segment,
+            reinterpret_cast<std::uint8_t const *>(target.words),
+            count,
+            bytes,
+            pointers ? 0 : bytes,
+            static_cast<std::uint16_t>(pointers ? 1 : 0),
+            static_cast<std::int16_t>(nesting - 1)};
+}
 
 /// A structure as it lies in a message, or one that is not there, whose fields all have their defaults. What generated
 /// readers are made of.
