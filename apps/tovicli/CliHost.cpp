@@ -104,6 +104,8 @@ Sink &CliHost::output() {
 ExitStatus CliHost::runLine(std::vector<std::string> const &words) {
     if (!lines_) {
         lines_ = std::make_unique<Tool>(context_, Tool::Tree::Kept);
+        // One for all lines: sessions that outlast a line name it to the daemon.
+        requestId_ = context_.environment.get("TOVI_REQUEST_ID");
     }
     restoreEnvironment();
     std::vector<std::string> arguments{"tovicli"};
@@ -125,7 +127,7 @@ void CliHost::restoreEnvironment() {
     put("TOVI_FORMAT", settings_.format);
     put("TOVI_PLUGINS", settings_.pluginDirectory);
     put("TOVI_OFFLINE", offlineByUser_ ? std::optional<std::string>("1") : std::nullopt);
-    put("TOVI_REQUEST_ID", settings_.requestId);
+    put("TOVI_REQUEST_ID", requestId_);
 }
 
 bool CliHost::isLine() const {

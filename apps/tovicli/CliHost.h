@@ -68,6 +68,7 @@ private:
     boost::weak_ptr<Plexa::AutoCli::Namespace> root_;
     std::optional<Registration> plugins_;
     std::unique_ptr<Tool> lines_;
+    std::optional<std::string> requestId_;
     std::optional<ExitStatus> status_;
 };
 

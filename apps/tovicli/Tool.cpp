@@ -160,50 +160,6 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
     return command == nullptr || full.help ? showHelp(*line.node) : runCommand(*command, line);
 }
 
-Tool::Root Tool::treeFor(Settings const &settings) {
-    if (tree_ == Tree::Fresh || CliHost::isWanted(path_)) {
-        return grow(settings);
-    }
-    // Plug-ins that found no daemon are asked again: there may be one by now.
-    if (keptTree_ == nullptr || keptOffline_ || !settings.servesSamePlugins(keptFor_)) {
-        keptTree_.reset(); // with the sessions that it holds
-        keptTree_ = grow(settings);
-        keptFor_ = settings;
-        keptOffline_ = registration_.daemonMissing;
-    } else {
-        apply(settings);
-        registration_ = Registration(); // whatever troubles there were have been told
-    }
-    return keptTree_;
-}
-
-Tool::Root Tool::grow(Settings const &settings) {
-    apply(settings);
-    if (!offlineByUser_) {
-        context_.environment.unset("TOVI_OFFLINE");
-    }
-    Root root = AutoCli::Namespace::New();
-    auto const storage = AutoCli::Namespace::New();
-    storage->SetDescription("Storage commands.");
-    root->RegisterNamespaceNode(storage, "storage");
-    std::string const trouble = cli_.hangInto(root, settings, offlineByUser_, path_);
-    if (CliHost::isWanted(path_)) {
-        registration_ = Registration();
-        if (!trouble.empty()) {
-            registration_.troubles.push_back(trouble);
-        }
-        return root;
-    }
-    registration_ = context_.plugins.registerInto(root, settings.pluginDirectory, context_.environment);
-    for (RegisteredPlugin const &plugin : registration_.plugins) {
-        Trace::Event(trace_, "plugin")
-            .text("name", plugin.name)
-            .duration("loadMs", plugin.loading)
-            .duration("registerMs", plugin.registering);
-    }
-    return root;
-}
-
 void Tool::apply(Settings const &settings) {
     settings_ = settings;
     if (requestId_.empty()) {
@@ -306,7 +262,8 @@ ExitStatus Tool::runCommand(AutoCli::Command &command, CommandLine const &line) 
 
     Outcome const outcome = work(command, line);
     if (cli_.status()) {
-        return written(*cli_.status(), {});
+        bool const isTold = *cli_.status() == ExitStatus::Unwritten;
+        return isTold ? ExitStatus::Unwritten : written(*cli_.status(), {});
     }
     std::string unheld; // why the format cannot hold the result
     auto const document = boost::dynamic_pointer_cast<MetaObj::MetaString>(outcome.result);

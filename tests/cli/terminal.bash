@@ -102,7 +102,7 @@ terminal_expect_gone() {
 
 # terminal_keys KEY...: presses keys: texts, or names such as Enter, Tab, C-c, Up.
 terminal_keys() {
-    terminal_tmux send-keys "$@"
+    terminal_tmux send-keys -- "$@"
 }
 
 # terminal_resize COLUMNS LINES

@@ -34,7 +34,7 @@ Report examine(CliServices &services) {
     }
     std::optional<StoreView> const view = checkStore(settings.root, std::min(timeout, longestWait), report);
     std::optional<Served> const served =
-        checkDaemon({settings.root, timeout, services.version(), services.isOffline()}, report);
+        checkDaemon({settings.root, timeout, services.version(), services.isOffline(), !services.isLine()}, report);
     if (view) {
         checkMounts(settings.root, *view, report);
         checkProviders(*view, served, report);

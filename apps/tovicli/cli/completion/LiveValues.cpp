@@ -20,7 +20,6 @@ using Candidates = std::vector<Candidate>;
 using Containers = std::unique_ptr<StorageContainerResult, decltype(&LumoLib_FreeStorageContainerResult)>;
 
 constexpr int32_t mostVolumes = 1000;
-constexpr int mostSessions = 1000; // closing one that is not open does nothing
 
 /// A session with the daemon, if there is one. It reads its settings from the environment.
 class Session {
@@ -28,10 +27,6 @@ public:
     explicit Session(LiveQuery const &query) {
         if (query.offline) {
             return;
-        }
-        // The plug-ins were registered offline and hold sessions that stay so: they are given up for a new one.
-        for (int opened = 0; opened < mostSessions; ++opened) {
-            LumoLib_Exit();
         }
         setenv("TOVI_ROOT", query.root.c_str(), 1);
         setenv("TOVI_TIMEOUT_MS", std::to_string(query.patience.count()).c_str(), 1);
@@ -186,7 +181,11 @@ private:
         }
         std::optional<std::string> const container = Wire::normalizeContainerId(query_.containerId);
         for (Store::Volume const &volume : store_.volumes()) {
-            bool const isMounted = volume.state == Store::VolumeState::Mounted;
+            bool const isMounted = volume.state == Store::VolumeState::Mounted ||
+                                   volume.state == Store::VolumeState::Mounting; // not settled yet
+            if (volume.state == Store::VolumeState::Removing) {
+                continue;
+            }
             bool const wanted = query_.live == Live::Volumes || isMounted == (query_.live == Live::MountedVolumes);
             if (wanted && (!container || volume.containerId == *container)) {
                 found.push_back({volume.directoryName, volume.uuid + (isMounted ? ", mounted" : "")});

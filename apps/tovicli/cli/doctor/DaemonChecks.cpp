@@ -134,10 +134,7 @@ void add(StorageContainerInfo const &container, Served &served) {
 }
 
 /// The session with the daemon is the process's; it takes its settings from the environment.
-std::optional<Served> askWhatIsServed(std::chrono::milliseconds timeout, Report &report) {
-    char const *const before = std::getenv("TOVI_TIMEOUT_MS");
-    std::string const kept = before != nullptr ? before : "";
-    setenv("TOVI_TIMEOUT_MS", std::to_string(timeout.count()).c_str(), 1);
+std::optional<Served> askWhatIsServed(Report &report) {
     StorageContainerResult *result = nullptr;
     std::string problem;
     if (LumoLib_Init(0, 0)) {
@@ -147,7 +144,6 @@ std::optional<Served> askWhatIsServed(std::chrono::milliseconds timeout, Report 
     } else {
         problem = "no session with the daemon can be opened";
     }
-    kept.empty() ? unsetenv("TOVI_TIMEOUT_MS") : setenv("TOVI_TIMEOUT_MS", kept.c_str(), 1);
     if (!problem.empty()) {
         report.fail("containers", problem);
         return std::nullopt;
@@ -173,12 +169,16 @@ std::optional<Served> checkDaemon(DaemonQuestion const &question, Report &report
         report.warn("daemon", "not asked: TOVI_OFFLINE is set");
         return std::nullopt;
     }
-    // One time for both questions.
     auto const deadline = Clock::now() + question.timeout;
     std::optional<Served> served;
     if (checkAnswer(question, report)) {
-        auto const left = std::chrono::duration_cast<std::chrono::milliseconds>(deadline - Clock::now());
-        served = askWhatIsServed(std::max(left, std::chrono::milliseconds(1)), report);
+        if (!question.isOwnProcess) {
+            served = askWhatIsServed(report); // the session is also others'
+        } else {
+            auto const left = std::chrono::duration_cast<std::chrono::milliseconds>(deadline - Clock::now());
+            setenv("TOVI_TIMEOUT_MS", std::to_string(std::max<int64_t>(left.count(), 1)).c_str(), 1);
+            served = askWhatIsServed(report);
+        }
     }
     LumoPlatform_ClearLastFailure(); // what failed stands in the rows
     return served;

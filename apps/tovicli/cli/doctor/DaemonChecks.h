@@ -16,6 +16,8 @@ struct DaemonQuestion {
     std::chrono::milliseconds timeout;
     std::string toolVersion;
     bool offline = false;
+    /// Nobody else in the process has a session: the two questions can share one timeout.
+    bool isOwnProcess = true;
 };
 
 /// What the daemon serves, told by the URL of the provider that serves it.

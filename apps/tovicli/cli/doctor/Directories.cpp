@@ -90,22 +90,37 @@ private:
         }
     }
 
+    /// A record is on its way until a later change settles it, so what counts is where the directory is.
     void checkVolume(Store::Volume const &volume) {
         std::string const container = containerNames_[volume.containerId];
         std::string const mounted = paths_.volumes() + "/" + container + "/" + volume.directoryName;
+        bool const isPutAway = isDirectory(paths_.lumos() + "/" + volume.uuid);
         std::string const name = "config volume " + container + "/" + volume.directoryName;
         switch (volume.state) {
         case Store::VolumeState::Mounted:
+        case Store::VolumeState::Mounting:
             ++mountedVolumes_;
-            if (!isDirectory(mounted)) {
+            if (isDirectory(mounted)) {
+                break;
+            }
+            if (volume.state == Store::VolumeState::Mounting && isPutAway) {
+                warn(name, "its mount was cut off; the next mount or unmount of any volume finishes it");
+            } else {
                 fail(name, "it is mounted, but its directory '" + mounted + "' is missing");
+            }
+            break;
+        case Store::VolumeState::Unmounting:
+            if (isDirectory(mounted) && !isPutAway) {
+                warn(name, "its unmount was cut off; the next mount or unmount of any volume finishes it");
+            }
+            break;
+        case Store::VolumeState::Removing:
+            if (isPutAway) {
+                warn(name, "its removal was cut off; removing it again finishes it");
             }
             break;
         case Store::VolumeState::Unmounted:
             break; // its content is put away, if it ever had any
-        default:
-            warn(name, "a mount, unmount or removal of it was cut off; the next one of any volume finishes it");
-            break;
         }
     }
 
