@@ -24,6 +24,9 @@ Wire::Failure invalid(std::string sentence) {
 }
 
 void checkSpec(VolumeSpec const &spec) {
+    if (spec.kind != VolumeKind::Config && spec.kind != VolumeKind::Data) {
+        throw invalid("there is no kind " + std::to_string(static_cast<int32_t>(spec.kind)) + " of virtual volume");
+    }
     if (spec.kind == VolumeKind::Config && spec.directoryName.empty()) {
         throw invalid("a config volume needs a directory name");
     }

@@ -88,10 +88,12 @@ TEST_F(MutatingAnArrayFile, refusesADirectoryNameThatIsTakenInTheContainerOnly) 
 TEST_F(MutatingAnArrayFile, refusesSpecificationsThatMakeNoSense) {
     auto data = spec("named");
     data.kind = VolumeKind::Data;
+    auto ofNoKind = spec("vm");
+    ofNoKind.kind = static_cast<VolumeKind>(7);
     auto nul = spec(std::string("a\0b", 3));
     auto nulProfile = spec("vm");
     nulProfile.profile = std::string("\0", 1);
-    for (auto const &asked : {spec(""), data, nul, nulProfile}) {
+    for (auto const &asked : {spec(""), data, ofNoKind, nul, nulProfile}) {
         EXPECT_EQ(codeOf([&] { file_.createVolume("", asked); }), Wire::ErrorCode::InvalidArgument);
     }
     EXPECT_EQ(codeOf([&] { file_.createVolume("", spec("vm", 0, noContainer)); }), Wire::ErrorCode::NoSuchContainer);
