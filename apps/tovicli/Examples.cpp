@@ -93,6 +93,18 @@ storage internal lumo virtualvolume get
 storage internal lumo virtualvolume metadata list
   --container-id 3f1a52de-6c1b-4b57-9a0e-2d8c7e5b9001 --uuid a1b20001-1111-4aaa-8aaa-000000000001
     What the array has noted about a volume.
+cli command list
+  --format table
+    Every command, and the plug-in that it comes from.
+cli plugin list
+  (none)
+    The plug-ins, and what became of each.
+cli plugin check
+  --file /usr/lib/tovicli/plugins/liblumointernal.so
+    Everything that is wrong with a plug-in, a line each.
+cli doctor
+  --timeout 2s
+    Looks the host over; a daemon that does not answer is given two seconds.
 )";
 
 std::string_view takeLine(std::string_view &text) {
@@ -137,7 +149,8 @@ std::vector<Example> examplesOf(Plexa::AutoCli::NamespaceNode &node, std::string
     }
     std::vector<Example> found;
     for (auto const &[line, purpose] : command->GetExamples()) {
-        found.push_back({{line}, purpose});
+        bool const whole = line.starts_with(program + " ");
+        found.push_back({{whole ? line : program + " " + line}, purpose});
     }
     if (!found.empty()) {
         return found;

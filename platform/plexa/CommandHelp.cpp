@@ -47,7 +47,8 @@ std::string commandHelp(AutoCli::Command &command, boost::shared_ptr<CallSpec::I
         help += "\nExamples:\n";
         for (auto const &example : examples) {
             appendWrapped(help, example.second, 2, width);
-            help += "      " + example.first + "\n";
+            bool const whole = example.first.starts_with(program + " ");
+            help += "      " + (whole ? "" : program + " ") + example.first + "\n";
         }
     }
     return help;
