@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "doctor/StoreView.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
@@ -101,8 +102,10 @@ std::optional<StoreView> checkStore(std::string const &root, Milliseconds patien
         return StoreView();
     }
     try {
+        auto const isHere = [](Store::Volume const &volume) { return volume.state != Store::VolumeState::Removing; };
         bool const unfinished = isUnfinished(path);
         StoreView view = unfinished ? readCopy(root, patience) : read(root, patience);
+        auto const volumes = static_cast<std::size_t>(std::count_if(view.volumes.begin(), view.volumes.end(), isHere));
         if (unfinished) {
             report.warn(name, "'" + path +
                                   "' holds an unfinished transaction of a process that was ended; the next "
@@ -112,7 +115,7 @@ std::optional<StoreView> checkStore(std::string const &root, Milliseconds patien
         } else {
             report.ok(name, "'" + path + "' is sound: " + counted(view.providers.size(), "provider", "providers") +
                                 ", " + counted(view.fileSystems.size(), "mounted container", "mounted containers") +
-                                ", " + counted(view.volumes.size(), "config volume", "config volumes"));
+                                ", " + counted(volumes, "config volume", "config volumes"));
         }
         return view;
     } catch (std::exception const &failure) {
