@@ -81,14 +81,6 @@ private:
 
 } // namespace
 
-bool isPlainAscii(std::string_view text) {
-    bool plain = true;
-    for (char const c : text) { // without a way out, so that it is done many bytes at a time
-        plain &= c >= ' ' && c != '\x7F';
-    }
-    return plain;
-}
-
 bool isValidUtf8(std::string_view text) {
     while (!text.empty()) {
         if (!takeCharacter(text).valid) {

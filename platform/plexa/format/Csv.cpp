@@ -61,7 +61,7 @@ public:
               [](std::string const &name) { return name; })
         , out_(sink)
         , cellWriter_(cell_)
-        , cellWalk_(settings, cellWriter_) {}
+        , cellWalk_("csv", settings, cellWriter_) {}
 
     void result(Result const &result) {
         MetaObject const *const value = result.value.get();
@@ -72,8 +72,8 @@ public:
         } else if (typeOf(value) == ValueType::List) {
             Object const element = elementSchema(&as<MetaList>(value), schema);
             std::vector<Object> const &elements = as<MetaList>(value).ViewElements();
-            bool const isTable = std::all_of(elements.begin(), elements.end(), isRow) &&
-                                 (!elements.empty() || kind == Kind::StructList);
+            bool const isTable =
+                std::all_of(elements.begin(), elements.end(), isRow) && (!elements.empty() || kind == Kind::StructList);
             isTable ? rows(elements, element.get()) : column(elements, element.get());
         } else {
             column({result.value}, schema);
@@ -188,6 +188,7 @@ private:
 } // namespace
 
 void writeCsv(Result const &result, FormatSettings const &settings, Sink &sink) {
+    checkShape(result.value.get(), "csv");
     CsvWriter(settings, sink).result(result);
 }
 

@@ -2,7 +2,6 @@
 #include "plexa/Formatter.h"
 
 #include "Formats.h"
-#include "ResultModel.h"
 #include "plexa/UsageError.h"
 
 namespace Plexa {
@@ -16,11 +15,6 @@ constexpr Format formats[] = {
 };
 
 } // namespace
-
-void Format::write(Result const &result, FormatSettings const &settings, Sink &sink) const {
-    checkShape(result, name);
-    emit(result, settings, sink);
-}
 
 Format const *findFormat(std::string const &name) {
     for (Format const &format : formats) {

@@ -8,7 +8,7 @@ namespace Plexa {
 void writeJson(Result const &result, FormatSettings const &settings, Sink &sink) {
     TextBuffer out(sink);
     JsonWriter<TextBuffer, JsonLayout::Lines> writer(out);
-    MachineWalk(settings, writer).result(result);
+    MachineWalk("json", settings, writer).result(result);
     out.put('\n');
 }
 

@@ -13,12 +13,27 @@ inline bool isPlainInJson(char c) {
     return c >= ' ' && c < '\x7F' && c != '"' && c != '\\';
 }
 
+/// Whether a whole text does. Without a way out of the loop, so that it is done many bytes at a time.
+inline bool isPlainInJson(std::string_view text) {
+    bool plain = true;
+    for (char const c : text) {
+        plain &= (c >= ' ') & (c != '\x7F') & (c != '"') & (c != '\\');
+    }
+    return plain;
+}
+
 /// The escape of one character that does not stand in a JSON string as it is, or the character.
 void appendJsonCharacter(std::string &to, Character const &character);
 
 /// Writes a text as a JSON string, quotes included, to anything that has append(std::string_view): a buffer, a string.
 template <typename Out>
 void writeJsonText(Out &out, std::string_view text) {
+    if constexpr (requires { out.appendQuoted(text); }) {
+        if (isPlainInJson(text)) {
+            out.appendQuoted(text);
+            return;
+        }
+    }
     out.append(std::string_view("\""));
     while (!text.empty()) {
         std::size_t plain = 0;

@@ -68,21 +68,22 @@ private:
         line_ += "  ";
     }
     void next(std::size_t index) {
-        put(index > 0 ? "," : "");
         if constexpr (layout == JsonLayout::Lines) {
-            put(line_);
+            put(std::string_view(line_).substr(index > 0 ? 0 : 1));
+        } else {
+            put(index > 0 ? "," : "");
         }
     }
     void end(std::string_view bracket, std::size_t count) {
         line_.resize(line_.size() - 2);
         if (layout == JsonLayout::Lines && count > 0) {
-            put(line_);
+            put(std::string_view(line_).substr(1));
         }
         put(bracket);
     }
 
     Out &out_;
-    std::string line_ = "\n"; // with the indentation behind it
+    std::string line_ = ",\n"; // with the indentation behind it; the comma only between two
 };
 
 } // namespace Plexa

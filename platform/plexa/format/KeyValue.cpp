@@ -118,7 +118,7 @@ private:
 void writeKeyValue(Result const &result, FormatSettings const &settings, Sink &sink) {
     TextBuffer out(sink);
     KeyValueWriter writer(out);
-    MachineWalk(settings, writer).result(result);
+    MachineWalk("keyvalue", settings, writer).result(result);
 }
 
 } // namespace Plexa

@@ -2,7 +2,6 @@
 #include "ResultModel.h"
 
 #include <algorithm>
-#include <typeinfo>
 #include <utility>
 
 #include "plexa/Text.h"
@@ -12,37 +11,6 @@ namespace Plexa {
 using namespace MetaObj;
 
 namespace {
-
-constexpr std::size_t deepest = 64;
-
-/// The type as it was made; Unset for none. A class that derives from one of MetaObj's counts as that one.
-ValueType declaredType(MetaObject const *value) {
-    if (value == nullptr) {
-        return ValueType::Unset;
-    }
-    std::type_info const *const type = &typeid(*value);
-    if (type == &typeid(MetaString)) {
-        return ValueType::Text;
-    }
-    if (type == &typeid(MetaInt)) {
-        return ValueType::Number;
-    }
-    if (type == &typeid(MetaBool)) {
-        return ValueType::Boolean;
-    }
-    if (type == &typeid(MetaList)) {
-        return ValueType::List;
-    }
-    if (type == &typeid(MetaStruct)) {
-        return ValueType::Struct;
-    }
-    return dynamic_cast<MetaString const *>(value) != nullptr   ? ValueType::Text
-           : dynamic_cast<MetaInt const *>(value) != nullptr    ? ValueType::Number
-           : dynamic_cast<MetaBool const *>(value) != nullptr   ? ValueType::Boolean
-           : dynamic_cast<MetaList const *>(value) != nullptr   ? ValueType::List
-           : dynamic_cast<MetaStruct const *>(value) != nullptr ? ValueType::Struct
-                                                                : ValueType::Unknown;
-}
 
 StructurePlan selected(StructurePlan const &fields, std::vector<std::string> const &names) {
     StructurePlan chosen;
@@ -64,14 +32,15 @@ bool haveNames(std::vector<MetaStruct::Field> const &fields, std::vector<std::st
 /// Walks through a result and remembers the field it is in.
 class ShapeCheck {
 public:
-    explicit ShapeCheck(std::string const &format)
-        : format_(format) {}
+    ShapeCheck(std::string const &format, std::string const *field)
+        : format_(format)
+        , field_(field) {}
 
     void check(MetaObject const *value, std::size_t depth) {
-        if (depth > deepest) {
-            refuse("is nested deeper than " + std::to_string(deepest) + " levels");
+        if (depth > deepestNesting) {
+            refuse(format_, field_, isNestedTooDeep);
         }
-        switch (typeOf(value)) {
+        switch (declaredType(value)) {
         case ValueType::List:
             for (Object const &element : as<MetaList>(value).ViewElements()) {
                 check(element.get(), depth + 1);
@@ -85,28 +54,26 @@ public:
             }
             break;
         case ValueType::Unknown:
-            refuse("is of a kind that it does not know");
+            refuse(format_, field_, isOfUnknownKind);
         default:
             break;
         }
     }
 
 private:
-    [[noreturn]] void refuse(std::string const &why) const {
-        throw FormatError("the format " + format_ + " cannot hold the result: " +
-                          (field_ != nullptr ? "the field '" + escaped(*field_) + "' " : "its value ") + why);
-    }
-
     std::string const &format_;
-    std::string const *field_ = nullptr;
+    std::string const *field_;
 };
 
 } // namespace
 
-ValueType typeOf(MetaObject const *value) {
-    ValueType const type = declaredType(value);
-    bool const isScalar = type == ValueType::Text || type == ValueType::Number || type == ValueType::Boolean;
-    return isScalar && !value->IsSet() ? ValueType::Unset : type;
+ValueType typeOfDerived(MetaObject const *value) {
+    return dynamic_cast<MetaString const *>(value) != nullptr   ? ValueType::Text
+           : dynamic_cast<MetaInt const *>(value) != nullptr    ? ValueType::Number
+           : dynamic_cast<MetaBool const *>(value) != nullptr   ? ValueType::Boolean
+           : dynamic_cast<MetaList const *>(value) != nullptr   ? ValueType::List
+           : dynamic_cast<MetaStruct const *>(value) != nullptr ? ValueType::Struct
+                                                                : ValueType::Unknown;
 }
 
 Kind kindOf(MetaObject const *value, MetaObject const *schema) {
@@ -147,8 +114,13 @@ Object elementSchema(MetaList const *list, MetaObject const *schema) {
     return element == nullptr && list != nullptr ? list->GetElementSchema() : element;
 }
 
-void checkShape(Result const &result, std::string const &format) {
-    ShapeCheck(format).check(result.value.get(), 0);
+void refuse(std::string const &format, std::string const *field, char const *why) {
+    throw FormatError("the format " + format + " cannot hold the result: " +
+                      (field != nullptr ? "the field '" + escaped(*field) + "' " : "its value ") + why);
+}
+
+void checkShape(MetaObject const *value, std::string const &format, std::string const *field) {
+    ShapeCheck(format, field).check(value, 0);
 }
 
 MetaObject const *findValue(MetaStruct const &structure, FieldPlan const &field) {

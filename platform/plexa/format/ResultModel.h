@@ -9,6 +9,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <typeinfo>
 #include <vector>
 
 #include <boost/shared_ptr.hpp>
@@ -24,12 +25,40 @@ using Object = boost::shared_ptr<MetaObj::MetaObject>;
 /// Unset is a value that is absent, or a scalar that was never set.
 enum class ValueType { Unset, Boolean, Number, Text, List, Struct, Unknown };
 
-ValueType typeOf(MetaObj::MetaObject const *value);
-
 /// Only for a value of that type.
 template <typename Value>
 Value const &as(MetaObj::MetaObject const *value) {
     return *static_cast<Value const *>(value);
+}
+
+/// For classes that derive from MetaObj's: such a one counts as what it derives from.
+ValueType typeOfDerived(MetaObj::MetaObject const *value);
+
+/// The type as it was made; Unset for none alone.
+inline ValueType declaredType(MetaObj::MetaObject const *value) {
+    if (value == nullptr) {
+        return ValueType::Unset;
+    }
+    std::type_info const *const type = &typeid(*value); // one object a class: no names need be compared
+    if (type == &typeid(MetaObj::MetaString)) {
+        return ValueType::Text;
+    }
+    if (type == &typeid(MetaObj::MetaInt)) {
+        return ValueType::Number;
+    }
+    if (type == &typeid(MetaObj::MetaBool)) {
+        return ValueType::Boolean;
+    }
+    if (type == &typeid(MetaObj::MetaList)) {
+        return ValueType::List;
+    }
+    return type == &typeid(MetaObj::MetaStruct) ? ValueType::Struct : typeOfDerived(value);
+}
+
+inline ValueType typeOf(MetaObj::MetaObject const *value) {
+    ValueType const type = declaredType(value);
+    bool const isScalar = type == ValueType::Text || type == ValueType::Number || type == ValueType::Boolean;
+    return isScalar && !value->IsSet() ? ValueType::Unset : type;
 }
 
 /// What a value is, or, where there is none, what its schema declares.
@@ -45,9 +74,18 @@ std::string scalarText(MetaObj::MetaObject const *value);
 /// The schema of a list's elements: what the list's own schema declares, else what the list was made with.
 Object elementSchema(MetaObj::MetaList const *list, MetaObj::MetaObject const *schema);
 
-/// Sees to it that every format can walk through the result to its end.
+/// Sees to it that every format can walk through a value to its end.
 /// @throws FormatError when it holds a value of a kind that is none of MetaObj's, or nests deeper than 64
-void checkShape(Result const &result, std::string const &format);
+/// @param field as for refuse
+void checkShape(MetaObj::MetaObject const *value, std::string const &format, std::string const *field = nullptr);
+
+constexpr std::size_t deepestNesting = 64;
+constexpr char const *isNestedTooDeep = "is nested deeper than 64 levels";
+constexpr char const *isOfUnknownKind = "is of a kind that it does not know";
+
+/// @param field the name of the field that the value stands in; null when it stands in none
+/// @throws FormatError
+[[noreturn]] void refuse(std::string const &format, std::string const *field, char const *why);
 
 /// A field of a structure and what it is declared as; the schema may be empty.
 struct FieldPlan {

@@ -105,6 +105,7 @@ private:
 } // namespace
 
 void writeSimple(Result const &result, FormatSettings const &settings, Sink &sink) {
+    checkShape(result.value.get(), "simple");
     // A text that is the whole result may bring its line end along.
     if (typeOf(result.value.get()) == ValueType::Text) {
         std::string line = scalarText(result.value.get());

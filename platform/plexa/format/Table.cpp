@@ -3,6 +3,7 @@
 // A table takes two walks over its rows: one for the widths of its columns, one to write. Nothing of a row is kept
 // between them.
 #include <algorithm>
+#include <charconv>
 
 #include "Formats.h"
 #include "Paint.h"
@@ -17,12 +18,22 @@ using namespace MetaObj;
 
 namespace {
 
+constexpr char const *format = "table";
 constexpr std::size_t step = 2;
+constexpr std::size_t longestNumber = 24;
 
 /// A cell in one line. The text may lie in the value or in the room that was given for it.
 struct Shown {
     std::string_view text;
     std::size_t width = 0;
+};
+
+/// What the walk for the widths found out about a table.
+struct Layout {
+    StructurePlan fields;        ///< all of them, over all rows
+    std::vector<Column> columns; ///< those that have one
+    StructurePlan apart;         ///< those that stand below their row
+    bool isUniform = true;       ///< every row holds the same fields in the same places
 };
 
 bool isCollection(MetaObject const *value) {
@@ -48,7 +59,17 @@ Shown shown(MetaObject const *value, std::string const &unit, std::string &room)
         std::string const &text = as<MetaString>(value).ViewValue();
         return {text, text.size()};
     }
-    room = escaped(scalarText(value));
+    if (type == ValueType::Boolean && unit.empty()) {
+        std::string_view const text = as<MetaBool>(value).GetValue() ? "true" : "false";
+        return {text, text.size()};
+    }
+    if (type == ValueType::Number) {
+        room.resize(longestNumber);
+        auto const [end, error] = std::to_chars(room.data(), room.data() + room.size(), as<MetaInt>(value).GetValue());
+        room.resize(static_cast<std::size_t>(end - room.data()));
+    } else {
+        room = escaped(scalarText(value));
+    }
     if (!unit.empty()) {
         room += ' ';
         room += escaped(unit);
@@ -72,7 +93,11 @@ public:
               settings, [&settings](std::string const &structure) { return settings.fields(structure); }, escapedName)
         , out_(sink) {}
 
+    /// The rows of a list are checked by the walk for the widths, all else by one of its own.
     void result(Result const &result) {
+        if (typeOf(result.value.get()) != ValueType::List) {
+            checkShape(result.value.get(), format);
+        }
         value(result.value, result.schema.get(), true, 0);
     }
 
@@ -87,7 +112,7 @@ private:
         case ValueType::Unset:
             break;
         case ValueType::Struct:
-            table({value}, schema, outermost, indent);
+            static_cast<void>(table({value}, schema, outermost, indent));
             break;
         case ValueType::List:
             list(as<MetaList>(value.get()), schema, outermost, indent);
@@ -101,74 +126,99 @@ private:
     void list(MetaList const &list, MetaObject const *schema, bool outermost, std::size_t indent) {
         Object const element = elementSchema(&list, schema);
         std::vector<Object> const &elements = list.ViewElements();
-        bool const rows = std::all_of(elements.begin(), elements.end(),
-                                      [](Object const &each) { return typeOf(each.get()) == ValueType::Struct; });
-        if (rows && (!elements.empty() || typeOf(element.get()) == ValueType::Struct)) {
-            table(elements, element.get(), outermost, indent);
+        bool const isDeclared = typeOf(element.get()) == ValueType::Struct;
+        if ((!elements.empty() || isDeclared) && table(elements, element.get(), outermost, indent)) {
             return;
         }
+        checkShape(&list, format);
         for (Object const &each : elements) {
             value(each, element.get(), outermost, isCollection(each.get()) ? indent + step : indent);
         }
     }
 
-    void table(std::vector<Object> const &rows, MetaObject const *schema, bool outermost, std::size_t indent) {
-        StructurePlan apart; // fields that stand below their row
-        std::vector<Column> columns = columnsOf(rows, schema, outermost, apart);
+    /// @return false, and nothing is written, when a row is no structure
+    bool table(std::vector<Object> const &rows, MetaObject const *schema, bool outermost, std::size_t indent) {
+        Layout layout;
+        if (!findColumns(rows, schema, outermost ? outermost_ : nested_, layout)) {
+            return false;
+        }
+        std::vector<Column> &columns = layout.columns;
         if (settings_.display().width > 0) {
             fitColumns(columns, settings_.display().width - std::min(settings_.display().width, indent));
         }
         heading(columns, indent);
         for (Object const &row : rows) {
             auto const &structure = as<MetaStruct>(row.get());
-            printRow(structure, columns, indent);
-            for (Column const &column : columns) {
-                if (needsRoomOfItsOwn(findValue(structure, column.field))) {
-                    below(structure, column.field, indent + step);
+            bool const isFlat = printRow(structure, layout, indent);
+            for (std::size_t i = 0; !isFlat && i < columns.size(); ++i) {
+                if (needsRoomOfItsOwn(findValue(structure, columns[i].field))) {
+                    below(structure, columns[i].field, indent + step);
                 }
             }
-            for (FieldPlan const &field : apart) {
+            for (FieldPlan const &field : layout.apart) {
                 below(structure, field, indent + step);
             }
         }
+        return true;
     }
 
-    std::vector<Column> columnsOf(std::vector<Object> const &rows, MetaObject const *schema, bool outermost,
-                                  StructurePlan &apart) {
-        StructurePlans &plans = outermost ? outermost_ : nested_;
-        StructurePlan fields;
-        std::shared_ptr<StructurePlan const> last;
+    /// The walk for the widths. A row may hold fields that no row before it has.
+    bool findColumns(std::vector<Object> const &rows, MetaObject const *schema, StructurePlans &plans, Layout &layout) {
         if (rows.empty()) {
-            fields = *plans.planOf(as<MetaStruct>(schema), schema);
+            addColumns(*plans.planOf(as<MetaStruct>(schema), schema), layout);
         }
+        std::shared_ptr<StructurePlan const> first;
+        std::shared_ptr<StructurePlan const> last;
         for (Object const &row : rows) {
-            std::shared_ptr<StructurePlan const> const plan = plans.planOf(as<MetaStruct>(row.get()), schema);
+            if (typeOf(row.get()) != ValueType::Struct) {
+                return false;
+            }
+            auto const &structure = as<MetaStruct>(row.get());
+            std::shared_ptr<StructurePlan const> const plan = plans.planOf(structure, schema);
             if (plan != last) {
-                merge(fields, *plan);
+                addColumns(*plan, layout);
+                layout.isUniform = first == nullptr;
+                first = first == nullptr ? plan : first;
                 last = plan;
             }
-        }
-        std::vector<Column> columns;
-        for (FieldPlan const &field : fields) {
-            Kind const kind = kindOf(nullptr, field.schema.get());
-            if (kind == Kind::StructList || kind == Kind::Struct) {
-                apart.push_back(field);
-            } else {
-                columns.push_back({field, displayWidth(field.label), kind == Kind::Number});
+            for (Column &column : layout.columns) {
+                MetaObject const *const value =
+                    plan == first ? valueOf(structure, column.field) : findValue(structure, column.field);
+                requireShape(value, column.field);
+                column.width = std::max(column.width, widthOf(value, column.field.unit));
+            }
+            for (FieldPlan const &field : layout.apart) {
+                requireShape(findValue(structure, field), field);
             }
         }
-        for (Object const &row : rows) {
-            for (Column &column : columns) {
-                column.width = std::max(column.width, widthOf(as<MetaStruct>(row.get()), column));
-            }
-        }
-        return columns;
+        return true;
     }
 
-    std::size_t widthOf(MetaStruct const &row, Column const &column) {
-        MetaObject const *const value = findValue(row, column.field);
+    static void requireShape(MetaObject const *value, FieldPlan const &field) {
+        if (isCollection(value)) {
+            checkShape(value, format, &field.name);
+        } else if (typeOf(value) == ValueType::Unknown) {
+            refuse(format, &field.name, isOfUnknownKind);
+        }
+    }
+
+    static void addColumns(StructurePlan const &plan, Layout &layout) {
+        std::size_t const before = layout.fields.size();
+        merge(layout.fields, plan);
+        for (std::size_t i = before; i < layout.fields.size(); ++i) {
+            FieldPlan const &field = layout.fields[i];
+            Kind const kind = kindOf(nullptr, field.schema.get());
+            if (kind == Kind::StructList || kind == Kind::Struct) {
+                layout.apart.push_back(field);
+            } else {
+                layout.columns.push_back({field, displayWidth(field.label), kind == Kind::Number});
+            }
+        }
+    }
+
+    std::size_t widthOf(MetaObject const *value, std::string const &unit) {
         if (!isCollection(value)) {
-            return shown(value, column.field.unit, room_).width;
+            return shown(value, unit, room_).width;
         }
         std::size_t width = 0;
         if (!needsRoomOfItsOwn(value)) {
@@ -190,24 +240,35 @@ private:
         printLines(rules, columns, indent, {});
     }
 
-    void printRow(MetaStruct const &row, std::vector<Column> const &columns, std::size_t indent) {
+    /// @return false when a cell is a list or a structure
+    bool printRow(MetaStruct const &row, Layout const &layout, std::size_t indent) {
+        std::vector<Column> const &columns = layout.columns;
         if (rooms_.size() < columns.size()) {
             rooms_.resize(columns.size());
             cells_.resize(columns.size());
         }
+        bool isFlat = true;
+        bool isTall = false;
         for (std::size_t i = 0; i < columns.size(); ++i) {
-            MetaObject const *const value = findValue(row, columns[i].field);
-            cells_[i] = isCollection(value) ? Shown() : shown(value, columns[i].field.unit, rooms_[i]);
-            if (isCollection(value) || cells_[i].width > columns[i].width) {
-                printTallRow(row, columns, indent);
-                return;
+            MetaObject const *const value =
+                layout.isUniform ? valueOf(row, columns[i].field) : findValue(row, columns[i].field);
+            if (isCollection(value)) {
+                isFlat = false;
+            } else {
+                cells_[i] = shown(value, columns[i].field.unit, rooms_[i]);
+                isTall = isTall || cells_[i].width > columns[i].width;
             }
+        }
+        if (isTall || !isFlat) {
+            printTallRow(row, columns, indent);
+            return isFlat;
         }
         std::size_t owed = indent; // blanks due before the next text, so that no line ends in any
         for (std::size_t i = 0; i < columns.size(); ++i) {
             put(cells_[i].text, cells_[i].width, columns[i], {}, owed);
         }
         out_.put('\n');
+        return true;
     }
 
     void printTallRow(MetaStruct const &row, std::vector<Column> const &columns, std::size_t indent) {

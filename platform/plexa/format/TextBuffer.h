@@ -38,6 +38,21 @@ public:
         size_ += text.size();
     }
 
+    /// The text between two quotes.
+    void appendQuoted(std::string_view text) {
+        if (text.size() + 2 > room - size_) {
+            put('"');
+            append(text);
+            put('"');
+            return;
+        }
+        char *const at = buffer_.data() + size_;
+        at[0] = '"';
+        std::copy(text.begin(), text.end(), at + 1);
+        at[text.size() + 1] = '"';
+        size_ += text.size() + 2;
+    }
+
     template <typename... Pieces>
     void print(Pieces const &...pieces) {
         (append(std::string_view(pieces)), ...);

@@ -138,6 +138,7 @@ private:
 } // namespace
 
 void writeTree(Result const &result, FormatSettings const &settings, Sink &sink) {
+    checkShape(result.value.get(), "tree");
     TreeWriter(settings, sink).result(result);
 }
 

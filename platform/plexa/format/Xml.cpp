@@ -238,7 +238,7 @@ void writeXml(Result const &result, FormatSettings const &settings, Sink &sink) 
     TextBuffer out(sink);
     out.append("<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<result>\n");
     XmlWriter writer(out);
-    MachineWalk(settings, writer).result(result);
+    MachineWalk("xml", settings, writer).result(result);
     out.append("</result>\n");
 }
 

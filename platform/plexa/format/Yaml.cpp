@@ -200,7 +200,7 @@ void writeYaml(Result const &result, FormatSettings const &settings, Sink &sink)
     TextBuffer out(sink);
     YamlWriter writer(out);
     out.append("---\n");
-    MachineWalk(settings, writer).result(result);
+    MachineWalk("yaml", settings, writer).result(result);
     out.put('\n');
 }
 

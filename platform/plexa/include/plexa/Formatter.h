@@ -45,11 +45,9 @@ struct Format {
     char const *name;
     /// For programs: one whole document, every declared field, no units, errors as documents too.
     bool isMachine;
-    void (*emit)(Result const &result, FormatSettings const &settings, Sink &sink);
-
     /// Writes one whole document. Whether it arrived is told by the sink.
-    /// @throws FormatError before anything is written
-    void write(Result const &result, FormatSettings const &settings, Sink &sink) const;
+    /// @throws FormatError before anything of the value, or of the list's element, in question is written
+    void (*write)(Result const &result, FormatSettings const &settings, Sink &sink);
 };
 
 /// @return null for a name that is no format's.

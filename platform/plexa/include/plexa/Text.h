@@ -16,7 +16,13 @@
 namespace Plexa {
 
 /// Whether a text can be shown as it is and takes one column a byte.
-bool isPlainAscii(std::string_view text);
+inline bool isPlainAscii(std::string_view text) {
+    bool plain = true;
+    for (char const c : text) { // without a way out, so that it is done many bytes at a time
+        plain &= (c >= ' ') & (c != '\x7F');
+    }
+    return plain;
+}
 
 bool isValidUtf8(std::string_view text);
 
