@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
 # shellcheck shell=bash
-# What lab/up and lab/down share: which process a root's daemon is. A process id alone may have passed to somebody else's
+# What lab/up and lab/down share: which processes a root's daemon and its orkasim are. A process id alone may have passed to somebody else's
 # process, so the record holds the time the process started as well, in clock ticks since the machine did.
 
 fail() {
@@ -24,10 +24,10 @@ start_time() {
     [ "${field[0]}" = Z ] || echo "${field[19]}"
 }
 
-# recorded_daemon ROOT: the id of the daemon that lab/up started on the root and that still runs; empty otherwise.
-recorded_daemon() {
+# recorded_process FILE: the id of the process that lab/up recorded there and that still runs; empty otherwise.
+recorded_process() {
     local pid started
-    { read -r pid started <"$1/run/lab.daemon"; } 2>/dev/null || return 0
+    { read -r pid started <"$1"; } 2>/dev/null || return 0
     if [ -n "$started" ] && [ "$(start_time "$pid")" = "$started" ]; then
         echo "$pid"
     fi

@@ -98,7 +98,7 @@ int run(Options const &options) {
     settings.root = paths.root();
     settings.version = TOVI_VERSION;
     settings.unbindPeriod = options.unbindPeriodUs * kj::MICROSECONDS;
-    Orka::ProviderSurroundings const providers{timer, nullptr};
+    Orka::ProviderSurroundings const providers{timer, nullptr, &io.provider->getNetwork(), paths.certificates()};
     Lumod::Daemon daemon(std::move(settings),
                          {timer, log,
                           [&providers](std::string const &url) { return Orka::makeProvider(url, providers); },

@@ -26,4 +26,7 @@ void make(Words const &words, Console const &console);
 /// show ARRAYFILE
 void show(Words const &words, Console const &console);
 
+/// serve [options] ARRAYFILE, until a signal ends it
+void serve(Words const &words, Console const &console);
+
 } // namespace Orkasim

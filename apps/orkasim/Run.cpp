@@ -19,10 +19,23 @@ struct Command {
     void (*execute)(Words const &, Console const &);
 };
 
-constexpr std::array<Command, 2> commands{{
+constexpr std::array<Command, 3> commands{{
     {"make", "[--force] TOPOLOGY ARRAYFILE",
      "makes an array file from a topology in JSON (- reads standard input); --force replaces an array file", make},
     {"show", "ARRAYFILE", "tells how much an array file holds", show},
+    {"serve", "[options] ARRAYFILE",
+     "serves an array file over HTTPS and prints its URL; SIGTERM ends it\n"
+     "      --listen ADDRESS:PORT  where (127.0.0.1:0: any free port of this host)\n"
+     "      --cert FILE --key FILE what it identifies itself by, in PEM; made and kept there when they are missing\n"
+     "      --cert-name NAME       whom a certificate that is made speaks for (the address)\n"
+     "      --expired-cert         makes one that is no longer valid\n"
+     "      --ready-file FILE      holds the URL when clients can come\n"
+     "      --latency MS           waits before every answer\n"
+     "      --error-rate PERCENT   so many requests are answered with status 503; --seed N chooses which\n"
+     "      --misbehave NAME       hang, drip, endless, huge, bomb, garbage, truncated, redirect, reset, unavailable\n"
+     "      --on OPERATION         misbehaves in this operation only\n"
+     "      --times N              misbehaves so many times, then no more",
+     serve},
 }};
 
 void writeUsage(std::ostream &stream) {

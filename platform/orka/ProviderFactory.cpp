@@ -4,6 +4,8 @@
 #include <optional>
 #include <string_view>
 
+#include "https/HttpsProvider.h"
+#include "https/Url.h"
 #include "orka/Embedded.h"
 
 namespace Orka {
@@ -80,7 +82,12 @@ std::unique_ptr<Provider> makeProvider(std::string const &url, ProviderSurroundi
     if (startsWithNoCase(url, "file://")) {
         return std::make_unique<EmbeddedProvider>(pathOfFileUrl(url), surroundings);
     }
-    throw badUrl(url, "providers are reached by file:///path/name.array");
+    if (surroundings.network != nullptr && startsWithNoCase(url, "https://")) {
+        return std::make_unique<Https::HttpsProvider>(Https::parseUrl(url), surroundings);
+    }
+    throw badUrl(url, surroundings.network == nullptr
+                          ? "providers are reached by file:///path/name.array"
+                          : "providers are reached by file:///path/name.array or https://host:port/path");
 }
 
 } // namespace Orka

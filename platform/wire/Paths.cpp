@@ -29,6 +29,10 @@ std::string Paths::arrays() const {
     return root_ + "/arrays";
 }
 
+std::string Paths::certificates() const {
+    return root_ + "/certs";
+}
+
 std::string Paths::run() const {
     return root_ + "/run";
 }

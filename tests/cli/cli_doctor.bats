@@ -172,7 +172,7 @@ os._exit(0)' "$TOVI_ROOT/host.db"
 
 @test "a provider's file that is missing, empty, or of somebody else's" {
     host_up
-    array="${LUMO_ARRAY_URL#file://}"
+    array="$LUMO_ARRAY_FILE"
     : >"$BATS_TEST_TMPDIR/empty.array"
     sqlite3 "$BATS_TEST_TMPDIR/other.array" "CREATE TABLE t (x)"
     mkdir "$BATS_TEST_TMPDIR/directory.array"

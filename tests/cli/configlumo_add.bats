@@ -8,7 +8,7 @@ setup() {
 
 # column_of COLUMN DIRECTORY: what the array keeps of the volume.
 column_of() {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT coalesce($1, 'NULL') FROM volume WHERE directory_name = '$2'"
+    sqlite3 "$LUMO_ARRAY_FILE" "SELECT coalesce($1, 'NULL') FROM volume WHERE directory_name = '$2'"
 }
 
 @test "a config volume is created on the array and not mounted" {

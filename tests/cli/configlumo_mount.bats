@@ -10,7 +10,7 @@ setup() {
 }
 
 bound_to() {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT e.uid FROM volume v JOIN endpoint e ON v.bound_to = e.seq
+    sqlite3 "$LUMO_ARRAY_FILE" "SELECT e.uid FROM volume v JOIN endpoint e ON v.bound_to = e.seq
         WHERE v.directory_name = '$1'"
 }
 

@@ -11,7 +11,7 @@ setup() {
 }
 
 bindings() {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT count(*) FROM volume WHERE directory_name = 'vm' AND bound_to IS NOT NULL"
+    sqlite3 "$LUMO_ARRAY_FILE" "SELECT count(*) FROM volume WHERE directory_name = 'vm' AND bound_to IS NOT NULL"
 }
 
 @test "by name" {

@@ -61,7 +61,7 @@ expect_notice() {
     expect_done $'true\n'
     lumo configlumo add -n thin -c "$container" -p gold
     expect_status 0
-    [ "$(sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT profile FROM volume WHERE directory_name IN ('plain', 'thin')
+    [ "$(sqlite3 "$LUMO_ARRAY_FILE" "SELECT profile FROM volume WHERE directory_name IN ('plain', 'thin')
         ORDER BY directory_name")" = $'gold\ngold;alloctype=thin' ]
 }
 

@@ -91,7 +91,7 @@ sys.exit(0 if eval(sys.argv[2]) is True else f"{sys.argv[2]}: {d}")' "$err" "$1"
 @test "--timeout reaches a provider that does not answer" {
     host_up
     register_provider
-    hold_lock "${LUMO_ARRAY_URL#file://}"
+    hold_lock "$LUMO_ARRAY_FILE"
     timed storagecontainer load --timeout 1s
     [ "$milliseconds" -lt 2500 ] || mismatch "an end within the timeout, it took $milliseconds ms"
     [ "$status" -ne 0 ]

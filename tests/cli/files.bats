@@ -69,7 +69,7 @@ expect_refused() {
 # The daemon opens the array file; the command shows what it says of it.
 for_array_file() {
     host_up
-    array="${LUMO_ARRAY_URL#file://}"
+    array="$LUMO_ARRAY_FILE"
     spoil "$array" "$1"
     register_provider
     expect_refused "$array" "$1" lumo storagecontainer load

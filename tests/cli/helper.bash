@@ -201,10 +201,10 @@ mounted_host() {
 
 # volume_uuid DIRECTORY: the uuid of the config volume of that directory name, as the array file has it.
 volume_uuid() {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT uuid FROM volume WHERE directory_name = '$1'"
+    sqlite3 "$LUMO_ARRAY_FILE" "SELECT uuid FROM volume WHERE directory_name = '$1'"
 }
 
 # all_endpoints: the uids of the endpoints of every array, as the array file has them.
 all_endpoints() {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT uid FROM endpoint WHERE uid IS NOT NULL ORDER BY uid"
+    sqlite3 "$LUMO_ARRAY_FILE" "SELECT uid FROM endpoint WHERE uid IS NOT NULL ORDER BY uid"
 }

@@ -99,19 +99,19 @@ EOF_OUT
 
 @test "a container with the name of one that is mounted is skipped" {
     load_containers
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE container SET id = '0' || substr(id, 2) WHERE name = 'silver'"
+    sqlite3 "$LUMO_ARRAY_FILE" "UPDATE container SET id = '0' || substr(id, 2) WHERE name = 'silver'"
     lumo storagecontainer load
     expect_done ""
 }
 
 @test "two exported containers of one name: the second is refused" {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE container SET name = 'gold' WHERE name = 'silver'"
+    sqlite3 "$LUMO_ARRAY_FILE" "UPDATE container SET name = 'gold' WHERE name = 'silver'"
     lumo storagecontainer load
     expect_failure 1 "Error getting/adding lumo file system '" "gold" ", skipping"
 }
 
 @test "what an array does not tell ends its endpoint's line" {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE endpoint SET text1 = NULL WHERE uid = 'pe-north-scsi-1';
+    sqlite3 "$LUMO_ARRAY_FILE" "UPDATE endpoint SET text1 = NULL WHERE uid = 'pe-north-scsi-1';
         UPDATE endpoint SET type = 7 WHERE uid = 'pe-north-scsi-2'; DELETE FROM endpoint_address"
     json_of storagecontainer load
     expect_status 0
@@ -128,7 +128,7 @@ EOF_OUT
 }
 
 @test "a container that the host refuses ends the load there; what was mounted before stays" {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE container SET name = '../silver' WHERE name = 'silver'"
+    sqlite3 "$LUMO_ARRAY_FILE" "UPDATE container SET name = '../silver' WHERE name = 'silver'"
     lumo storagecontainer load
     expect_failure 1 "Error getting/adding lumo file system '" ", skipping"
     [ -d "$TOVI_ROOT/volumes/gold" ]
@@ -137,7 +137,7 @@ EOF_OUT
 }
 
 @test "fault_64 names and ids that a terminal would obey are shown, not sent" {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE storage_array SET name = 'a' || char(27) || '[31m' || char(13) || char(0x202e)"
+    sqlite3 "$LUMO_ARRAY_FILE" "UPDATE storage_array SET name = 'a' || char(27) || '[31m' || char(13) || char(0x202e)"
     lumo storagecontainer load
     expect_status 0
     expect_out_has 'Name: a\x1b[31m\r\u202e'

@@ -22,7 +22,7 @@ silent_daemon() {
 @test "time is shown while a provider is silent, and gone before the result" {
     host_up
     register_provider
-    hold_lock "${LUMO_ARRAY_URL#file://}"
+    hold_lock "$LUMO_ARRAY_FILE"
     terminal_start -- tovicli storage internal lumo storagecontainer load --format table --fields "StorageContainer Name"
     terminal_expect "tovicli: working, "
     release_lock
@@ -66,7 +66,7 @@ silent_daemon() {
 @test "Ctrl-C ends a command that waits for a silent provider, and the daemon serves on" {
     host_up
     register_provider
-    hold_lock "${LUMO_ARRAY_URL#file://}"
+    hold_lock "$LUMO_ARRAY_FILE"
     terminal_start -- tovicli storage internal lumo storagecontainer load
     terminal_expect "tovicli: working, "
     terminal_keys C-c

@@ -20,7 +20,7 @@ fields='["Container Id", "Lumo UUID", "Logical Size", "Committed Size", "Unshare
 }
 
 @test "an unshared size that the array cannot tell is left out, or null" {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE volume SET unshared_mb = NULL WHERE uuid = '$uuid'"
+    sqlite3 "$LUMO_ARRAY_FILE" "UPDATE volume SET unshared_mb = NULL WHERE uuid = '$uuid'"
     json_of virtualvolume get -c "$container" -u "$uuid"
     expect_status 0
     expect_json "d['Unshared Size Valid'] is False and d['Unshared Size'] is None"
@@ -30,7 +30,7 @@ fields='["Container Id", "Lumo UUID", "Logical Size", "Committed Size", "Unshare
 }
 
 @test "a volume without a profile has a block size" {
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "UPDATE volume SET profile = NULL WHERE uuid = '$uuid'"
+    sqlite3 "$LUMO_ARRAY_FILE" "UPDATE volume SET profile = NULL WHERE uuid = '$uuid'"
     json_of virtualvolume get -c "$container" -u "$uuid"
     expect_status 0
     expect_json "d['Storage Profile'] is None and d['Block Size'] > 0"

@@ -13,9 +13,9 @@ setup() {
 # metadata [KEY VALUE]...: gives the volume exactly these pairs.
 metadata() {
     local position=0
-    sqlite3 "${LUMO_ARRAY_URL#file://}" "DELETE FROM metadata WHERE volume = (SELECT seq FROM volume WHERE uuid = '$uuid')"
+    sqlite3 "$LUMO_ARRAY_FILE" "DELETE FROM metadata WHERE volume = (SELECT seq FROM volume WHERE uuid = '$uuid')"
     while [ $# -gt 0 ]; do
-        sqlite3 "${LUMO_ARRAY_URL#file://}" "INSERT INTO metadata SELECT seq, $((position++)), '$1', '$2' FROM volume
+        sqlite3 "$LUMO_ARRAY_FILE" "INSERT INTO metadata SELECT seq, $((position++)), '$1', '$2' FROM volume
             WHERE uuid = '$uuid'"
         shift 2
     done

@@ -45,7 +45,7 @@ statuses() {
     lumo configlumo mount -n vm -c "$container"
     expect_status 0
     uuid="$(volume_uuid vm)"
-    bound="$(sqlite3 "${LUMO_ARRAY_URL#file://}" "SELECT e.uid FROM volume v JOIN endpoint e ON v.bound_to = e.seq
+    bound="$(sqlite3 "$LUMO_ARRAY_FILE" "SELECT e.uid FROM volume v JOIN endpoint e ON v.bound_to = e.seq
         WHERE v.uuid = '$uuid'")"
     lumo daemon set --start-pe-apd "$bound"
     [ "$(statuses)" = "['inaccessible']" ]

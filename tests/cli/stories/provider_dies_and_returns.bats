@@ -7,7 +7,7 @@ load ../helper
 @test "a dead provider and its return" {
     mounted_host
     path="$TOVI_ROOT/volumes/$container_name"
-    array_file="${LUMO_ARRAY_URL#file://}"
+    array_file="$LUMO_ARRAY_FILE"
     lumo configlumo add -n vm -c "$container"
     expect_status 0
     uuid="$(volume_uuid vm)"

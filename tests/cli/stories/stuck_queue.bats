@@ -9,7 +9,7 @@ load ../helper
     "$TOVI_BUILD_DIR/bin/orkasim" make "$BATS_TEST_DIRNAME/../topologies/second.json" "$TOVI_ROOT/arrays/second.array"
     lumo orkaprovider add --vp-name second --vp-url "file://$TOVI_ROOT/arrays/second.array"
     load_containers
-    slow="${LUMO_ARRAY_URL#file://}"
+    slow="$LUMO_ARRAY_FILE"
     second=5ec00000-0000-4000-8000-000000000001
 
     lumo daemon set --log-level trivia

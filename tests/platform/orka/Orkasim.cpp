@@ -34,7 +34,19 @@ std::string const usage =
     "      makes an array file from a topology in JSON (- reads standard input); --force replaces "
     "an array file\n"
     "  orkasim show ARRAYFILE\n"
-    "      tells how much an array file holds\n";
+    "      tells how much an array file holds\n"
+    "  orkasim serve [options] ARRAYFILE\n"
+    "      serves an array file over HTTPS and prints its URL; SIGTERM ends it\n"
+    "      --listen ADDRESS:PORT  where (127.0.0.1:0: any free port of this host)\n"
+    "      --cert FILE --key FILE what it identifies itself by, in PEM; made and kept there when they are missing\n"
+    "      --cert-name NAME       whom a certificate that is made speaks for (the address)\n"
+    "      --expired-cert         makes one that is no longer valid\n"
+    "      --ready-file FILE      holds the URL when clients can come\n"
+    "      --latency MS           waits before every answer\n"
+    "      --error-rate PERCENT   so many requests are answered with status 503; --seed N chooses which\n"
+    "      --misbehave NAME       hang, drip, endless, huge, bomb, garbage, truncated, redirect, reset, unavailable\n"
+    "      --on OPERATION         misbehaves in this operation only\n"
+    "      --times N              misbehaves so many times, then no more\n";
 
 } // namespace
 
@@ -128,6 +140,17 @@ TEST_F(OrkasimTest, tellsWhatIsWrongWithTheWords) {
              {{"make", "--fast", "a", "b"}, "there is no option '--fast'"},
              {{"show"}, "ARRAYFILE is missing"},
              {{"show", "--force", "a"}, "there is no option '--force'"},
+             {{"serve"}, "ARRAYFILE is missing"},
+             {{"serve", "--listen"}, "--listen needs a value"},
+             {{"serve", "--listen", "here", "a"}, "--listen is ADDRESS:PORT, not 'here'"},
+             {{"serve", "--latency=soon", "a"}, "--latency is a whole number from 0 to 3600000, not 'soon'"},
+             {{"serve", "--seed=1", "--seed=2", "a"}, "--seed stands there twice"},
+             {{"serve", "--cert", "c", "a"}, "--cert and --key go together"},
+             {{"serve", "--on", "getMetadata", "a"}, "--on and --times tell when to --misbehave"},
+             {{"serve", "--misbehave", "steal", "a"},
+              "--misbehave is one of hang, drip, endless, huge, bomb, garbage, truncated, redirect, reset, "
+              "unavailable, "
+              "not 'steal'"},
          }) {
         EXPECT_EQ(run(words), 2);
         EXPECT_EQ(err_, std::string("orkasim: ") + sentence + "\n" + usage);

@@ -20,6 +20,8 @@ public:
     /// Content of config volumes while they are not mounted, one directory a volume.
     std::string lumos() const;
     std::string arrays() const;
+    /// The directory of certificates that are pinned for providers.
+    std::string certificates() const;
     /// The directory of sockets, lock file and pid file.
     std::string run() const;
     std::string orderedSocket() const;

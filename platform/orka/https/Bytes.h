@@ -1,0 +1,16 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+
+#include <kj/async-io.h>
+
+namespace Orka::Https {
+
+/// Reads a stream to its end; nothing when it holds more than `most` bytes, of which no more are then read. Room is
+/// taken for what has come, not for what was announced. The stream is the caller's until the promise is done.
+kj::Promise<std::optional<std::string>> readUpTo(kj::AsyncInputStream &stream, std::size_t most);
+
+} // namespace Orka::Https
