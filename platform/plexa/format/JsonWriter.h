@@ -32,6 +32,10 @@ public:
         put(value ? "true" : "false");
     }
     void number(int64_t value) {
+        if constexpr (requires { out_.number(value); }) {
+            out_.number(value);
+            return;
+        }
         char digits[24];
         auto const [end, error] = std::to_chars(digits, digits + sizeof(digits), value);
         put(std::string_view(digits, static_cast<std::size_t>(end - digits)));

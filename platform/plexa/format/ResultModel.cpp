@@ -2,6 +2,8 @@
 #include "ResultModel.h"
 
 #include <algorithm>
+#include <cstdint>
+#include <cstring>
 #include <utility>
 
 #include "plexa/Text.h"
@@ -24,9 +26,32 @@ StructurePlan selected(StructurePlan const &fields, std::vector<std::string> con
     return chosen;
 }
 
+/// Names are short, and compared so often that a call for each would show.
+bool isSame(std::string const &left, std::string const &right) {
+    if (left.size() != right.size()) {
+        return false;
+    }
+    std::size_t at = 0;
+    for (; at + sizeof(uint64_t) <= left.size(); at += sizeof(uint64_t)) {
+        uint64_t first = 0;
+        uint64_t second = 0;
+        std::memcpy(&first, left.data() + at, sizeof(first));
+        std::memcpy(&second, right.data() + at, sizeof(second));
+        if (first != second) {
+            return false;
+        }
+    }
+    for (; at < left.size(); ++at) {
+        if (left[at] != right[at]) {
+            return false;
+        }
+    }
+    return true;
+}
+
 bool haveNames(std::vector<MetaStruct::Field> const &fields, std::vector<std::string> const &names) {
     return std::equal(fields.begin(), fields.end(), names.begin(), names.end(),
-                      [](MetaStruct::Field const &field, std::string const &name) { return field.name == name; });
+                      [](MetaStruct::Field const &field, std::string const &name) { return isSame(field.name, name); });
 }
 
 /// Walks through a result and remembers the field it is in.
@@ -125,7 +150,7 @@ void checkShape(MetaObject const *value, std::string const &format, std::string 
 
 MetaObject const *findValue(MetaStruct const &structure, FieldPlan const &field) {
     std::vector<MetaStruct::Field> const &fields = structure.ViewFields();
-    if (field.index < fields.size() && fields[field.index].name == field.name) {
+    if (field.index < fields.size() && isSame(fields[field.index].name, field.name)) {
         return fields[field.index].value.get();
     }
     for (MetaStruct::Field const &candidate : fields) {

@@ -147,8 +147,9 @@ private:
             fitColumns(columns, settings_.display().width - std::min(settings_.display().width, indent));
         }
         heading(columns, indent);
-        for (Object const &row : rows) {
-            auto const &structure = as<MetaStruct>(row.get());
+        for (std::size_t r = 0; r < rows.size(); ++r) {
+
+            auto const &structure = as<MetaStruct>(rows[r].get());
             bool const isFlat = printRow(structure, layout, indent);
             for (std::size_t i = 0; !isFlat && i < columns.size(); ++i) {
                 if (needsRoomOfItsOwn(findValue(structure, columns[i].field))) {
@@ -169,11 +170,12 @@ private:
         }
         std::shared_ptr<StructurePlan const> first;
         std::shared_ptr<StructurePlan const> last;
-        for (Object const &row : rows) {
-            if (typeOf(row.get()) != ValueType::Struct) {
+        for (std::size_t r = 0; r < rows.size(); ++r) {
+
+            if (typeOf(rows[r].get()) != ValueType::Struct) {
                 return false;
             }
-            auto const &structure = as<MetaStruct>(row.get());
+            auto const &structure = as<MetaStruct>(rows[r].get());
             std::shared_ptr<StructurePlan const> const plan = plans.planOf(structure, schema);
             if (plan != last) {
                 addColumns(*plan, layout);

@@ -6,6 +6,7 @@
 #include <charconv>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <string_view>
 
 #include "plexa/Sink.h"
@@ -34,7 +35,7 @@ public:
                 return;
             }
         }
-        std::copy(text.begin(), text.end(), buffer_.begin() + static_cast<std::ptrdiff_t>(size_));
+        copy(buffer_.data() + size_, text);
         size_ += text.size();
     }
 
@@ -48,7 +49,7 @@ public:
         }
         char *const at = buffer_.data() + size_;
         at[0] = '"';
-        std::copy(text.begin(), text.end(), at + 1);
+        copy(at + 1, text);
         at[text.size() + 1] = '"';
         size_ += text.size() + 2;
     }
@@ -78,9 +79,12 @@ public:
     }
 
     void number(int64_t value) {
-        std::array<char, 24> digits;
-        auto const [end, error] = std::to_chars(digits.data(), digits.data() + digits.size(), value);
-        append(std::string_view(digits.data(), static_cast<std::size_t>(end - digits.data())));
+        constexpr std::size_t longest = 24;
+        if (room - size_ < longest) {
+            flush();
+        }
+        char *const at = buffer_.data() + size_;
+        size_ += static_cast<std::size_t>(std::to_chars(at, at + longest, value).ptr - at);
     }
 
     void flush() {
@@ -91,6 +95,25 @@ public:
     }
 
 private:
+    /// Most pieces are labels and names; copied in two moves that may overlap they take no call.
+    static void copy(char *to, std::string_view text) {
+        std::size_t const size = text.size();
+        char const *const from = text.data();
+        if (size > 32) {
+            std::memcpy(to, from, size);
+        } else if (size >= 16) {
+            std::memcpy(to, from, 16);
+            std::memcpy(to + size - 16, from + size - 16, 16);
+        } else if (size >= 8) {
+            std::memcpy(to, from, 8);
+            std::memcpy(to + size - 8, from + size - 8, 8);
+        } else {
+            for (std::size_t i = 0; i < size; ++i) {
+                to[i] = from[i];
+            }
+        }
+    }
+
     Sink &sink_;
     std::size_t size_ = 0;
     std::array<char, room> buffer_; // not initialised: only what was written is read
