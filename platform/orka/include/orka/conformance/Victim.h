@@ -10,14 +10,16 @@
 #include <string>
 #include <vector>
 
-#include "orka/ProviderFactory.h"
+#include <kj/async-io.h>
+
+#include "orka/Provider.h"
 
 namespace Orka::Conformance {
 
-/// Performs one mutation: KEY create CONTAINER NAME, KEY delete CONTAINER UUID, KEY bind CONTAINER UUID ENDPOINT, or KEY
-/// unbind CONTAINER UUID.
+/// Performs one mutation: KEY create CONTAINER NAME, KEY delete CONTAINER UUID, KEY bind CONTAINER UUID ENDPOINT, or
+/// KEY unbind CONTAINER UUID.
 /// @return the status that the process should end with: 0, or 1 when the mutation failed or the words make no sense
 int actAsVictim(std::vector<std::string> const &words,
-                std::function<std::unique_ptr<Provider>(ProviderSurroundings const &)> const &connect);
+                std::function<std::unique_ptr<Provider>(kj::Timer &, kj::Network &)> const &connect);
 
 } // namespace Orka::Conformance
