@@ -68,7 +68,10 @@ public:
         writer_.Bool(value);
     }
     void kind(char const *member, VolumeKind value) {
-        text(member, std::string(value == VolumeKind::Data ? "data" : "config"));
+        // One that there is not is for the provider to refuse, not to be taken for another here.
+        text(member, value == VolumeKind::Config ? "config"
+                     : value == VolumeKind::Data ? "data"
+                                                 : "kind " + std::to_string(static_cast<int32_t>(value)));
     }
     void bytes(char const *member, std::vector<uint8_t> const &value) {
         text(member, base64Of(value));
