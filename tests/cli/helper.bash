@@ -16,10 +16,13 @@ out="$BATS_TEST_TMPDIR/out"
 err="$BATS_TEST_TMPDIR/err"
 status=0
 
-# host_up [lab/up options]: a fresh root with one array, served by a lumod; what follows works on it.
+# host_up [lab/up options]: a fresh root with one array, served by a lumod; what follows works on it. With
+# TOVI_LAB_HTTPS=1 the array is behind orkasim, and every transcript has to come out the same.
 host_up() {
     local settings
-    settings="$("$top/lab/up" --root "$BATS_TEST_TMPDIR/host" --build "$TOVI_BUILD_DIR" "$@" 2>"$BATS_TEST_TMPDIR/up")" || {
+    local -a https=()
+    [ "${TOVI_LAB_HTTPS:-}" != 1 ] || https=(--https)
+    settings="$("$top/lab/up" "${https[@]}" --root "$BATS_TEST_TMPDIR/host" --build "$TOVI_BUILD_DIR" "$@" 2>"$BATS_TEST_TMPDIR/up")" || {
         cat "$BATS_TEST_TMPDIR/up" >&2
         return 1
     }
@@ -28,7 +31,7 @@ host_up() {
 
 # host_down: stops this test's lumod, if it runs; the root stays for whoever looks into a failure.
 host_down() {
-    if [ -e "$BATS_TEST_TMPDIR/host/run/lab.daemon" ]; then
+    if [ -e "$BATS_TEST_TMPDIR/host/run/lab.daemon" ] || [ -e "$BATS_TEST_TMPDIR/host/run/lab.orkasim" ]; then
         "$top/lab/down" --root "$BATS_TEST_TMPDIR/host" 2>"$BATS_TEST_TMPDIR/down" || {
             cat "$BATS_TEST_TMPDIR/down" >&2
             return 1

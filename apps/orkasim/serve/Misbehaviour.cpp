@@ -25,7 +25,7 @@ constexpr std::array<std::pair<char const *, Misdeed>, 10> misdeeds{{{"hang", Mi
                                                                      {"unavailable", Misdeed::Unavailable}}};
 
 constexpr uint64_t hugeBytes = uint64_t{10} << 30;
-constexpr std::size_t bombBlocks = 1024;
+constexpr std::size_t bombBlocks = 64;
 constexpr std::size_t blockBytes = std::size_t{1} << 20;
 
 /// Takes an answer and shows it to nobody.

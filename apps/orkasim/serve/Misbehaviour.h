@@ -20,7 +20,7 @@ enum class Misdeed {
     Drip,        ///< an answer at a byte a second
     Endless,     ///< an answer without an end
     Huge,        ///< announces 10 GB, and begins to send them
-    Bomb,        ///< 1 GiB of blanks in a compressed body of 1 MiB
+    Bomb,        ///< 64 MiB of blanks in a compressed body of 64 KiB
     Garbage,     ///< bytes that are no JSON
     Truncated,   ///< the first half of a document
     Redirect,    ///< to another place

@@ -41,7 +41,7 @@ public:
         auto const node = at(member);
         auto canonical = Wire::normalizeContainerId(node.text());
         if (!canonical) {
-            node.fail("a UUID is expected, not " + quoted(node.text()));
+            node.fail("a UUID is expected, not " + Orka::quoted(node.text()));
         }
         value = *std::move(canonical);
     }
@@ -67,7 +67,7 @@ public:
         auto const node = at(member);
         auto const word = node.text();
         if (word != "config" && word != "data") {
-            node.fail("\"config\" or \"data\" is expected, not " + quoted(word));
+            node.fail("\"config\" or \"data\" is expected, not " + Orka::quoted(word));
         }
         value = word == "data" ? VolumeKind::Data : VolumeKind::Config;
     }
@@ -117,7 +117,7 @@ private:
     JsonNode at(char const *member) const {
         auto const *const value = find(member);
         if (value == nullptr) {
-            node_.fail("the member " + quoted(member) + " is missing");
+            node_.fail("the member " + Orka::quoted(member) + " is missing");
         }
         return {*value, node_, member};
     }

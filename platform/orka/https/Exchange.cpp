@@ -156,6 +156,8 @@ kj::Promise<Exchange::Attempt> Exchange::over(kj::Own<Connection> connection, st
 kj::Promise<Exchange::Attempt> Exchange::readAnswer(kj::HttpClient::Response &&response, kj::Own<Connection> connection,
                                                     std::shared_ptr<Asked> asked) {
     asked->isAnswering = true;
+    // Goes before the connection that it comes over, whichever way this ends.
+    auto incoming = kj::mv(response.body);
     auto const status = response.statusCode;
     if (status >= 300 && status < 400) {
         return Attempt{
@@ -174,9 +176,9 @@ kj::Promise<Exchange::Attempt> Exchange::readAnswer(kj::HttpClient::Response &&r
     KJ_IF_MAYBE (value, response.headers->get(kj::HttpHeaderId::CONNECTION)) {
         mayBeKept = *value != "close";
     }
-    auto &stream = *response.body;
+    auto &stream = *incoming;
     return readUpTo(stream, answerBytesMax)
-        .attach(kj::mv(response.body))
+        .attach(kj::mv(incoming))
         .then([this, status, hasJson, mayBeKept, asked,
                connection = kj::mv(connection)](std::optional<std::string> &&body) mutable -> Attempt {
             if (!body) {
