@@ -106,11 +106,16 @@ int main(int argc, char **argv) {
     Plexa::Sink &errors = completing ? static_cast<Plexa::Sink &>(untold) : told;
     Tovicli::ProcessEnvironment environment;
     Tovicli::PluginLoader plugins(installed + "/lib", geteuid());
-    Tovicli::Context context{output,          errors,
-                             environment,     plugins,
-                             randomRequestId, {installed + "/lib/tovicli/plugins", workingDirectory()},
-                             terminalWidth(), getauxval(AT_SECURE) != 0,
-                             &activity,       {},
+    Tovicli::Context context{output,
+                             errors,
+                             environment,
+                             plugins,
+                             randomRequestId,
+                             {installed + "/lib/tovicli/plugins", workingDirectory()},
+                             terminalWidth(),
+                             getauxval(AT_SECURE) != 0,
+                             &activity,
+                             {},
                              Tovicli::cliLibrary(installed + "/lib/tovicli/libtovicli-cli.so")};
     context.display = outputDisplay(environment);
     return static_cast<int>(Tovicli::Tool(context).run(std::vector<std::string>(argv, argv + argc)));
