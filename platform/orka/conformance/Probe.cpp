@@ -81,19 +81,19 @@ Outcome<Done> Probe::tryUnbind(VirtualVolume const &volume, std::string const &k
 }
 
 VirtualVolume Probe::make(VolumeSpec const &spec) {
-    return expectSuccess("a volume is made", tryMake(spec));
+    return expectSuccess("a volume is made", tryMake(spec, freshKey()));
 }
 
 void Probe::remove(VirtualVolume const &volume) {
-    expectSuccess("a volume that is not bound is deleted", tryRemove(volume));
+    expectSuccess("a volume that is not bound is deleted", tryRemove(volume, freshKey()));
 }
 
 void Probe::bind(VirtualVolume const &volume, std::string const &endpoint) {
-    expectSuccess("a volume is bound to an accessible endpoint", tryBind(volume, endpoint));
+    expectSuccess("a volume is bound to an accessible endpoint", tryBind(volume, endpoint, freshKey()));
 }
 
 void Probe::unbind(VirtualVolume const &volume) {
-    expectSuccess("a volume is unbound", tryUnbind(volume));
+    expectSuccess("a volume is unbound", tryUnbind(volume, freshKey()));
 }
 
 VirtualVolume Probe::facts(VirtualVolume const &volume) {
@@ -132,19 +132,32 @@ int64_t Probe::countNamed(std::string const &name) {
                          [&](ConfigVolume const &volume) { return volume.directoryName == name; });
 }
 
+std::string Probe::tryRemoveOwn(VirtualVolume const &volume) {
+    try {
+        // Whatever comes of unbinding: a provider that gets that wrong may delete all the same.
+        auto const unbound = tryUnbind(volume, freshKey());
+        auto const removed = tryRemove(volume, freshKey());
+        bool const isGone = removed.ok() || removed.failure().code() == Wire::ErrorCode::NoSuchVolume;
+        return isGone ? std::string() : show(removed.failure());
+    } catch (Unmet const &unmet) {
+        return unmet.came;
+    }
+}
+
 void Probe::removeOwn(std::string const &containerId, std::string const &uuid, std::vector<std::string> &failures) {
     VirtualVolume volume;
     volume.containerId = containerId;
     volume.uuid = uuid;
-    try {
-        // Whatever comes of unbinding: a provider that gets that wrong may delete all the same.
-        auto const unbound = tryUnbind(volume);
-        auto const outcome = tryRemove(volume);
-        if (!outcome.ok() && outcome.failure().code() != Wire::ErrorCode::NoSuchVolume) {
-            failures.push_back("the volume " + show(uuid) + " could not be removed: " + show(outcome.failure()));
-        }
-    } catch (Unmet const &unmet) {
-        failures.push_back("the volume " + show(uuid) + " could not be removed: " + unmet.came);
+    // What fails now and then shall leave nothing behind.
+    constexpr int attempts = 5;
+    auto why = tryRemoveOwn(volume);
+    for (int attempt = 1; attempt < attempts && !why.empty(); ++attempt) {
+        pass(attempt * 10 * kj::MILLISECONDS);
+        reconnect();
+        why = tryRemoveOwn(volume);
+    }
+    if (!why.empty()) {
+        failures.push_back("the volume " + show(uuid) + " could not be removed: " + why);
     }
 }
 

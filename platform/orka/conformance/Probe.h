@@ -84,7 +84,8 @@ public:
     /// Lets the event loop work for that long.
     void pass(kj::Duration time);
 
-    // Operations through the case's connection. Those that begin with "try" give what came; the others must succeed.
+    // Operations through the case's connection. Those that begin with "try" give what came; the others must succeed,
+    // and carry keys, so that a connection which fails now and then may be tried again.
 
     Outcome<VirtualVolume> tryMake(VolumeSpec const &spec, std::string const &key = "");
     Outcome<Done> tryRemove(VirtualVolume const &volume, std::string const &key = "");
@@ -124,6 +125,8 @@ private:
     /// How long an operation that has begun is waited for when the run is to end.
     static constexpr kj::Duration farewell = 2 * kj::SECONDS;
 
+    /// @return why the volume could not be removed; empty: it is gone
+    std::string tryRemoveOwn(VirtualVolume const &volume);
     void removeOwn(std::string const &containerId, std::string const &uuid, std::vector<std::string> &failures);
 
     Surroundings const &surroundings_;

@@ -174,7 +174,7 @@ public:
         return Forwarding::queryVirtualVolume(context, containerId, uuid)
             .then(
                 [inner = share(), context, containerId, uuid](Outcome<VirtualVolume> &&found) mutable -> Answer<Done> {
-                    if (found.ok() && !found.value().boundTo && context.idempotencyKey.empty()) {
+                    if (found.ok() && !found.value().boundTo) {
                         return Outcome<Done>(Wire::Failure(Wire::ErrorCode::InUse, "the volume is not bound"));
                     }
                     return inner->provider->unbindVirtualVolume(context, containerId, uuid).attach(kj::mv(inner));

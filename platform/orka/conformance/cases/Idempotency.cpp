@@ -168,8 +168,17 @@ void otherKey(Probe &probe) {
 
 void noKey(Probe &probe) {
     auto const spec = probe.freshSpec();
-    probe.make(spec);
+    auto const made = makeWith(probe, spec, "");
     expectFailure("the same without a key", Wire::ErrorCode::AlreadyExists, probe.tryMake(spec));
+    auto const &endpoint = probe.ground().endpoint();
+    for (int round = 0; round < 2; ++round) {
+        expectSuccess("binding it without a key", probe.tryBind(made, endpoint));
+        expectEqual("what it is bound through", std::optional<std::string>(endpoint), probe.facts(made).boundTo);
+        expectSuccess("unbinding it without a key", probe.tryUnbind(made));
+        expectEqual("what it is bound through", std::optional<std::string>(), probe.facts(made).boundTo);
+    }
+    expectSuccess("deleting it without a key", probe.tryRemove(made));
+    makeWith(probe, spec, "");
 }
 
 /// Two keys that look alike are two keys.
@@ -215,7 +224,7 @@ Cases idempotencyCases() {
         {"idempotency/failure/tried-anew", "What failed is tried anew with the same key.", failureIsNotKept},
         {"idempotency/failure/key-free", "The key of what failed may come with something else.", failedKeyIsFree},
         {"idempotency/key/another", "Another key is another making.", otherKey},
-        {"idempotency/key/none", "Without a key, every making is a new one.", noKey},
+        {"idempotency/key/none", "Without a key, every mutation is a new one.", noKey},
         {"idempotency/key/case", "Keys that differ in case are two keys.",
          [](Probe &probe) { tellsApart(probe, "-k", "-K"); }},
         {"idempotency/key/long", "Keys that differ at their 1000th character are two keys.",
