@@ -62,6 +62,7 @@ expect_offers() {
 }
 
 @test "bash: names that the host knows, however the option is written" {
+    needs_file_url
     mounted_host
     script bash
     expect_offers tovicli storage internal lumo orkaprovider set --vp-name "" -- lab

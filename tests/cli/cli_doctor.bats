@@ -109,6 +109,7 @@ os._exit(0)' "$TOVI_ROOT/host.db"
 }
 
 @test "a dead daemon and its stale socket" {
+    needs_file_url
     mounted_host
     pid="$(cat "$TOVI_ROOT/run/lumod.pid")"
     kill -KILL "$pid"
