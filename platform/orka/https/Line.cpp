@@ -4,8 +4,6 @@
 #include <string_view>
 #include <utility>
 
-#include <kj/debug.h>
-
 namespace Orka::Https {
 
 namespace {
@@ -93,8 +91,7 @@ kj::Promise<kj::Own<kj::NetworkAddress>> Line::address() {
         lookupSince_ = timer_.now();
         lookup_ = kj::evalNow([this] { return lookUp(); }).fork();
     }
-    return KJ_ASSERT_NONNULL(lookup_).addBranch().then(
-        [self = kj::addRef(*this)]() mutable { return self->found_->clone(); });
+    return lookup_.addBranch().then([self = kj::addRef(*this)]() mutable { return self->found_->clone(); });
 }
 
 kj::Promise<Outcome<kj::Own<Connection>>> Line::connection(bool fresh, std::shared_ptr<Step> step) {

@@ -74,7 +74,7 @@ private:
     Headers headers_;
     std::deque<kj::Own<Connection>> idle_;
     /// One name lookup serves everybody who waits for it: those of a resolver that hangs must not gather threads.
-    kj::Maybe<kj::ForkedPromise<void>> lookup_;
+    kj::ForkedPromise<void> lookup_ = nullptr;
     bool isLookingUp_ = false;
     kj::TimePoint lookupSince_ = kj::origin<kj::TimePoint>();
     kj::Own<kj::NetworkAddress> found_;

@@ -157,7 +157,8 @@ TEST_F(OpenApiTest, describesEveryMessageAsItIsReadAndWritten) {
 
 TEST_F(OpenApiTest, describesEveryOperationThatIsServedAndNoOther) {
     int count = 0;
-    for (auto const &path : document_["paths"].GetObject()) {
+    rapidjson::Value const &paths = document_["paths"];
+    for (auto const &path : paths.GetObject()) {
         std::string const name(path.name.GetString());
         ASSERT_EQ(name.rfind("/v1/", 0), 0U) << name;
         EXPECT_NE(ServiceOperations::named(name.substr(4)), nullptr) << name;
