@@ -275,4 +275,21 @@ TEST(Outcomes, fault_63_OutputThatCannotBeWrittenIsToldWithWhatWasDone) {
     EXPECT_EQ(harness.errors, "tovicli: cannot write the output: No space left on device\n");
 }
 
+/// A value of a kind that no format knows.
+class Strange : public Plexa::MetaObj::MetaObject {};
+
+TEST(Outcomes, AResultThatTheFormatCannotHoldIsNoSuccess) {
+    ToolHarness harness;
+    harness.command->behaviour = [](Input const &, Output &output) {
+        output.SetResult(boost::shared_ptr<Plexa::MetaObj::MetaObject>(new Strange));
+        output.Complete();
+    };
+    EXPECT_EQ(harness.run({"--format=yaml", "storage", "sample"}), 4);
+    EXPECT_THAT(harness.errors,
+                StartsWith("{\"error\":{\"message\":\"the format yaml cannot hold the result: its value is of "
+                           "a kind that it does not know; the command itself was completed\""));
+    EXPECT_EQ(harness.run({"--format=simple", "storage", "sample"}), 4);
+    EXPECT_EQ(harness.output, "");
+}
+
 } // namespace
