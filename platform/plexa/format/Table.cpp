@@ -147,9 +147,9 @@ private:
             fitColumns(columns, settings_.display().width - std::min(settings_.display().width, indent));
         }
         heading(columns, indent);
-        for (std::size_t r = 0; r < rows.size(); ++r) {
+        for (Object const &row : rows) {
 
-            auto const &structure = as<MetaStruct>(rows[r].get());
+            auto const &structure = as<MetaStruct>(row.get());
             bool const isFlat = printRow(structure, layout, indent);
             for (std::size_t i = 0; !isFlat && i < columns.size(); ++i) {
                 if (needsRoomOfItsOwn(findValue(structure, columns[i].field))) {
@@ -170,12 +170,12 @@ private:
         }
         std::shared_ptr<StructurePlan const> first;
         std::shared_ptr<StructurePlan const> last;
-        for (std::size_t r = 0; r < rows.size(); ++r) {
+        for (Object const &row : rows) {
 
-            if (typeOf(rows[r].get()) != ValueType::Struct) {
+            if (typeOf(row.get()) != ValueType::Struct) {
                 return false;
             }
-            auto const &structure = as<MetaStruct>(rows[r].get());
+            auto const &structure = as<MetaStruct>(row.get());
             std::shared_ptr<StructurePlan const> const plan = plans.planOf(structure, schema);
             if (plan != last) {
                 addColumns(*plan, layout);
