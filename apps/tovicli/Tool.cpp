@@ -91,6 +91,7 @@ ExitStatus Tool::run(std::vector<std::string> const &arguments) {
     requestId_.clear(); // each run is a request of its own
     ExitStatus const status = runReported(arguments);
     report_.finish();
+    trace_.release();
     if (trace_.isEnabled()) {
         context_.plugins.traceRequests({});
         Trace::Event(trace_, "end").number("status", static_cast<int64_t>(status));
@@ -125,6 +126,9 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
     if (settings.version) {
         return showVersion();
     }
+    if (settings.logLevel != "trivia") {
+        trace_.hold(); // a --log-level further on may be the command's own
+    }
     try {
         settings = settingsFrom(*reading.probable, environment, context_.defaults);
     } catch (UsageError const &) {
@@ -146,6 +150,7 @@ ExitStatus Tool::runWords(std::vector<std::string> const &words) {
         }
     }
     apply(full);
+    trace_.release();
     traceParsed(line);
     for (std::string const &trouble : registration_.troubles) {
         report_.warn(trouble);

@@ -26,6 +26,32 @@ Trace::Trace(Plexa::Sink &sink, Clock clock)
     , clock_(clock ? std::move(clock) : Clock(processClock))
     , began_(clock_()) {}
 
+void Trace::setEnabled(bool enabled) {
+    enabled_ = enabled;
+    if (!enabled && held_) {
+        held_->clear();
+    }
+}
+
+void Trace::hold() {
+    held_.emplace();
+}
+
+void Trace::release() {
+    if (held_ && !held_->empty()) {
+        sink_.write(*held_);
+    }
+    held_.reset();
+}
+
+void Trace::write(std::string const &line) {
+    if (held_) {
+        *held_ += line;
+    } else {
+        sink_.write(line);
+    }
+}
+
 std::chrono::microseconds Trace::elapsed() const {
     return clock_() - began_;
 }
@@ -39,7 +65,7 @@ Trace::Event::Event(Trace &trace, char const *name)
 
 Trace::Event::~Event() {
     if (!line_.empty()) {
-        trace_.sink_.write(line_ + "\n");
+        trace_.write(line_ + "\n");
     }
 }
 

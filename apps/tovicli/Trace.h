@@ -12,6 +12,7 @@
 #include <chrono>
 #include <cstdint>
 #include <functional>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -26,9 +27,12 @@ public:
     /// @param clock time that passes; null: the process's own
     Trace(Plexa::Sink &sink, Clock clock);
 
-    void setEnabled(bool enabled) {
-        enabled_ = enabled;
-    }
+    /// Events that are held back are dropped with it.
+    void setEnabled(bool enabled);
+    /// Keeps events back until it is certain that they are wanted.
+    void hold();
+    /// Writes what was held back.
+    void release();
     bool isEnabled() const {
         return enabled_;
     }
@@ -53,7 +57,10 @@ public:
     };
 
 private:
+    void write(std::string const &line);
+
     Plexa::Sink &sink_;
+    std::optional<std::string> held_;
     Clock clock_;
     std::chrono::microseconds began_;
     bool enabled_ = false;

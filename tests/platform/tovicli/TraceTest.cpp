@@ -54,6 +54,23 @@ TEST(Trace, IsSilentAtOtherLevels) {
     }
 }
 
+TEST(Trace, MayBeAskedForBehindThePathAndThenTellsTheStepsBefore) {
+    TracedHarness harness;
+    EXPECT_EQ(harness.run({"storage", "sample", "--log-level", "trivia"}), 0);
+    EXPECT_THAT(harness.errors, ::testing::StartsWith("tovicli: trace: 1.500 run version=\"1.0.0\" "
+                                                      "request=\"request-1\"\n"
+                                                      "tovicli: trace: 3.000 plugin "));
+    EXPECT_THAT(harness.errors, HasSubstr(" call method="));
+}
+
+TEST(Trace, IsNotMeantByACommandsOwnOptionOfThatName) {
+    TracedHarness harness;
+    harness.command->parameter("log-level", Plexa::CallSpec::String);
+    EXPECT_EQ(harness.run({"storage", "sample", "--log-level", "trivia"}), 0);
+    EXPECT_EQ(harness.errors, "");
+    EXPECT_EQ(harness.output, "true\n");
+}
+
 TEST(Trace, TheErrorDocumentIsALineAmongTheOthers) {
     TracedHarness harness;
     harness.command->behaviour = [](Input const &, Output &output) { output.SetMessage("a\nb"); };
