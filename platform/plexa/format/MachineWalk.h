@@ -74,7 +74,6 @@ private:
         enter();
         writer_.beginList(elements.size());
         for (std::size_t i = 0; i < elements.size(); ++i) {
-
             writer_.element(i);
             value(elements[i].get(), element.get(), outermost);
         }

@@ -148,7 +148,6 @@ private:
         }
         heading(columns, indent);
         for (Object const &row : rows) {
-
             auto const &structure = as<MetaStruct>(row.get());
             bool const isFlat = printRow(structure, layout, indent);
             for (std::size_t i = 0; !isFlat && i < columns.size(); ++i) {
@@ -171,7 +170,6 @@ private:
         std::shared_ptr<StructurePlan const> first;
         std::shared_ptr<StructurePlan const> last;
         for (Object const &row : rows) {
-
             if (typeOf(row.get()) != ValueType::Struct) {
                 return false;
             }
