@@ -191,9 +191,12 @@ std::string caseList(Format format) {
 std::string bugList(Format format) {
     std::string text;
     for (auto const &bug : Orka::Conformance::bugs()) {
-        text += format == Format::Markdown
-                    ? fmt::format("| `{}` | {} | `{}` |\n", bug.name, cell(bug.description), bug.caughtBy)
-                    : fmt::format("{}\n    {}\n    found by {}\n", bug.name, bug.description, bug.caughtBy);
+        std::string const overHttps =
+            bug.hiddenOverHttps != nullptr ? fmt::format("no: {}", bug.hiddenOverHttps) : "yes";
+        text += format == Format::Markdown ? fmt::format("| `{}` | {} | `{}` | {} |\n", bug.name, cell(bug.description),
+                                                         bug.caughtBy, cell(overHttps))
+                                           : fmt::format("{}\n    {}\n    found by {}\n    over HTTPS: {}\n", bug.name,
+                                                         bug.description, bug.caughtBy, overHttps);
     }
     return text;
 }

@@ -34,7 +34,8 @@ constexpr std::array<Command, 3> commands{{
      "      --error-rate PERCENT   so many requests are answered with status 503; --seed N chooses which\n"
      "      --misbehave NAME       hang, drip, endless, huge, bomb, garbage, truncated, redirect, reset, unavailable\n"
      "      --on OPERATION         misbehaves in this operation only\n"
-     "      --times N              misbehaves so many times, then no more",
+     "      --times N              misbehaves so many times, then no more\n"
+     "      --bug NAME             breaks one promise of a provider's; --bug help lists which there are",
      serve},
 }};
 

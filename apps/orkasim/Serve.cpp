@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+#include <algorithm>
 #include <csignal>
+#include <memory>
 #include <ostream>
 
 #include <fmt/format.h>
@@ -12,6 +14,7 @@
 #include "orka/ArrayFile.h"
 #include "orka/Embedded.h"
 #include "orka/Service.h"
+#include "orka/conformance/Bugs.h"
 #include "serve/Certificate.h"
 #include "serve/Misbehaviour.h"
 #include "serve/Server.h"
@@ -32,14 +35,38 @@ struct Options {
     std::string certificate;
     std::string key;
     std::string readyFile;
+    std::string bug; ///< empty: none
     CertificateSpec certificateSpec;
     MisbehaviourSpec misbehaviour;
 };
 
+std::string checkedBug(std::string name) {
+    auto const &bugs = Orka::Conformance::bugs();
+    auto const isIt = [&](Orka::Conformance::Bug const &bug) { return bug.name == name; };
+    if (!name.empty() && std::none_of(bugs.begin(), bugs.end(), isIt)) {
+        throw UsageError("there is no bug '" + name + "'; 'orkasim serve --bug help' lists them all");
+    }
+    return name;
+}
+
+/// Whether the words ask what bugs there are, in place of an array to serve.
+bool asksForBugs(Words const &words) {
+    return words == Words{"--bug", "help"} || words == Words{"--bug=help"};
+}
+
+void listBugs(std::ostream &out) {
+    for (auto const &bug : Orka::Conformance::bugs()) {
+        out << bug.name << "\n    " << bug.description << "\n    "
+            << (bug.hiddenOverHttps != nullptr ? std::string("hidden here: ") + bug.hiddenOverHttps
+                                               : std::string("found by ") + bug.caughtBy)
+            << '\n';
+    }
+}
+
 Options optionsOf(Words const &words) {
     SortedWords const sorted(words, {"--expired-cert"},
                              {"--listen", "--cert", "--key", "--ready-file", "--cert-name", "--latency", "--error-rate",
-                              "--seed", "--misbehave", "--on", "--times"});
+                              "--seed", "--misbehave", "--on", "--times", "--bug"});
     Options options;
     options.array = sorted.named({"ARRAYFILE"})[0];
     options.listen = sorted.value("--listen").value_or(defaultListen);
@@ -63,6 +90,7 @@ Options optionsOf(Words const &words) {
         options.certificateSpec.validFrom = std::chrono::hours(-48);
         options.certificateSpec.validUntil = std::chrono::hours(-24);
     }
+    options.bug = checkedBug(sorted.value("--bug").value_or(""));
     auto &misbehaviour = options.misbehaviour;
     misbehaviour.latency = sorted.number("--latency", 0, longestMs).value_or(0) * kj::MILLISECONDS;
     misbehaviour.errorRate = sorted.number("--error-rate", 0, 100).value_or(0);
@@ -94,6 +122,13 @@ Identity identityFor(Options const &options) {
     return identity;
 }
 
+/// The array file as it is, or seen through the bug that was asked for.
+std::unique_ptr<Orka::Provider> providerFor(Options const &options, kj::Timer &timer) {
+    auto provider = std::make_unique<Orka::EmbeddedProvider>(options.array, Orka::ProviderSurroundings{timer, nullptr});
+    return options.bug.empty() ? std::move(provider)
+                               : Orka::Conformance::makeBuggy(options.bug, std::move(provider), timer);
+}
+
 /// Every client takes a descriptor.
 void raiseDescriptorLimit() {
     rlimit limit{};
@@ -115,6 +150,10 @@ kj::Own<kj::ConnectionReceiver> listenAt(kj::AsyncIoContext &io, std::string con
 } // namespace
 
 void serve(Words const &words, Console const &console) {
+    if (asksForBugs(words)) {
+        listBugs(console.out);
+        return;
+    }
     auto const options = optionsOf(words);
     // What is no array file is told now, not to the first client.
     Orka::ArrayFile(options.array).counts();
@@ -125,8 +164,8 @@ void serve(Words const &words, Console const &console) {
     }
     auto io = kj::setupAsyncIo();
     auto &timer = io.provider->getTimer();
-    Orka::EmbeddedProvider provider(options.array, {timer, nullptr});
-    Orka::ProviderService service(provider, timer, servedPath);
+    auto const provider = providerFor(options, timer);
+    Orka::ProviderService service(*provider, timer, servedPath);
     Misbehaviour misbehaviour(service, timer, options.misbehaviour);
     auto port = listenAt(io, options.listen);
     auto const url = fmt::format("https://{}:{}{}", options.host, port->getPort(), servedPath);

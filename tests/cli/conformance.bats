@@ -129,3 +129,9 @@ assert [case.get("name") for case in suite.findall("testcase") if case.find("fai
     expect_err ""
     [ "$(contents)" = "$before" ]
 }
+
+@test "docs/conformance.md shows what happens" {
+    cd "$top"
+    export TMPDIR="$BATS_TEST_TMPDIR"
+    python3 "$BATS_TEST_DIRNAME/run_tour.py" docs/conformance.md 3>&- >&2
+}

@@ -13,22 +13,14 @@ setup() {
 }
 
 teardown() {
-    if [ -n "${server:-}" ]; then
-        kill "$server"
-        wait "$server" || true
-    fi
+    serve_no_more
     rm -rf "$place"
 }
 
-# serve OPTIONS...: leaves $url, and the server's certificate pinned in $place/certs.
+# serve OPTIONS...: the array over HTTPS, its certificate pinned in $place/certs.
 serve() {
-    mkfifo "$place/url"
-    orkasim serve --cert "$place/cert.pem" --key "$place/key.pem" "$@" "$place/test.array" >"$place/url" 2>"$place/log" 3>&- &
-    server=$!
-    read -r url <"$place/url"
-    mkdir "$place/certs"
-    local port="${url##*:}"
-    cp "$place/cert.pem" "$place/certs/127.0.0.1_${port%%/*}.pem"
+    serve_array "$place/test.array" "$@"
+    pin_certificate "$place/certs"
 }
 
 # conformance ARGS...: runs the program on the server; leaves $status, $out and $err.
@@ -50,6 +42,13 @@ conformance() {
     conformance --bug looks-then-makes --only concurrency/create/two
     expect_status 1
     expect_out_has "came     a second one did"
+}
+
+@test "a simulator's bug is found from the other side" {
+    serve --bug stats-in-bytes
+    conformance --only 'volume/space-stats/*'
+    expect_status 1
+    expect_out_has "FAILED   volume/space-stats/agree-with-facts"
 }
 
 @test "what a provider refuses now and then is tried again, and nothing stays" {

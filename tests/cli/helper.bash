@@ -51,9 +51,11 @@ host_without_daemon() {
 }
 
 lock_holder=""
+array_server=""
 
 teardown() {
     release_lock
+    serve_no_more
     host_down
 }
 
@@ -184,6 +186,35 @@ release_lock() {
     wait "$lock_holder" 2>/dev/null || true
     lock_holder=""
     rm -f "$BATS_TEST_TMPDIR/lock.go" "$BATS_TEST_TMPDIR/lock.held"
+}
+
+# serve_array FILE OPTIONS...: an orkasim of the test's own. Leaves its $url and its $certificate, which pin_certificate
+# lets a host or the kit trust. A second one replaces the first.
+serve_array() {
+    serve_no_more
+    local pipe="$BATS_TEST_TMPDIR/serve.url"
+    certificate="$BATS_TEST_TMPDIR/serve.cert.pem"
+    mkfifo "$pipe"
+    orkasim serve --cert "$certificate" --key "$BATS_TEST_TMPDIR/serve.key.pem" "${@:2}" "$1" \
+        >"$pipe" 2>"$BATS_TEST_TMPDIR/serve.log" 3>&- &
+    array_server=$!
+    read -r url <"$pipe"
+    rm "$pipe"
+}
+
+serve_no_more() {
+    [ -n "$array_server" ] || return 0
+    kill "$array_server"
+    wait "$array_server" || true
+    array_server=""
+}
+
+# pin_certificate DIRECTORY: the certificate of the last serve_array as its client looks for it there.
+pin_certificate() {
+    local authority="${url#https://}"
+    authority="${authority%%/*}"
+    mkdir -p "$1"
+    cp "$certificate" "$1/${authority%:*}_${authority##*:}.pem"
 }
 
 # stored_providers: the host's records, one line each, as name|url, then arrays as id/active/priority.

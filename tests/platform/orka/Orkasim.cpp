@@ -5,6 +5,7 @@
 #include <sstream>
 
 #include "Run.h"
+#include "orka/conformance/Bugs.h"
 
 namespace {
 
@@ -46,7 +47,8 @@ std::string const usage =
     "      --error-rate PERCENT   so many requests are answered with status 503; --seed N chooses which\n"
     "      --misbehave NAME       hang, drip, endless, huge, bomb, garbage, truncated, redirect, reset, unavailable\n"
     "      --on OPERATION         misbehaves in this operation only\n"
-    "      --times N              misbehaves so many times, then no more\n";
+    "      --times N              misbehaves so many times, then no more\n"
+    "      --bug NAME             breaks one promise of a provider's; --bug help lists which there are\n";
 
 } // namespace
 
@@ -151,6 +153,7 @@ TEST_F(OrkasimTest, tellsWhatIsWrongWithTheWords) {
               "--misbehave is one of hang, drip, endless, huge, bomb, garbage, truncated, redirect, reset, "
               "unavailable, "
               "not 'steal'"},
+             {{"serve", "--bug", "nope", "a"}, "there is no bug 'nope'; 'orkasim serve --bug help' lists them all"},
          }) {
         EXPECT_EQ(run(words), 2);
         EXPECT_EQ(err_, std::string("orkasim: ") + sentence + "\n" + usage);
@@ -163,6 +166,18 @@ TEST_F(OrkasimTest, helpsWhenAsked) {
     EXPECT_EQ(out_, usage);
     EXPECT_EQ(run({"make", "-h"}), 0);
     EXPECT_EQ(out_, usage);
+}
+
+TEST_F(OrkasimTest, listsEveryBugAndWhatBecomesOfIt) {
+    EXPECT_EQ(run({"serve", "--bug", "help"}), 0);
+    for (auto const &bug : Orka::Conformance::bugs()) {
+        auto const entry = std::string(bug.name) + "\n    " + bug.description + '\n';
+        EXPECT_NE(out_.find(entry), std::string::npos) << bug.name;
+    }
+    EXPECT_NE(out_.find("rebinds\n    A volume that is bound is bound to another endpoint instead.\n"
+                        "    found by volume/bind/other-endpoint\n"),
+              std::string::npos);
+    EXPECT_NE(out_.find("    hidden here: the client takes no more than it asked for\n"), std::string::npos);
 }
 
 TEST_F(OrkasimTest, takesAWordAfterTheDashesAsAName) {

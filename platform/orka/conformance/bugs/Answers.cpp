@@ -165,11 +165,12 @@ std::vector<Bug> answerBugs() {
         {"loses-metadata", "Metadata is always empty.", "volume/metadata/directory-name", put<LosesMetadata>},
         {"rejects-promises", "A volume that there is not rejects the promise.", "unknown-volume/query-volume",
          put<RejectsPromises>},
-        {"speechless", "A failure has no sentence.", "unknown-volume/metadata", put<Speechless>},
+        {"speechless", "A failure has no sentence.", "unknown-volume/metadata", put<Speechless>,
+         "the client says something itself"},
         {"answers-late", "What has little time is answered ten seconds late.", "deadline/short/query-arrays",
-         put<AnswersLate>},
+         put<AnswersLate>, "the client does not wait longer than its deadline"},
         {"works-after-deadline", "A volume is made although the deadline has passed.", "deadline/passed/create",
-         put<WorksAfterDeadline>},
+         put<WorksAfterDeadline>, "the client asks for nothing after its deadline"},
     };
 }
 

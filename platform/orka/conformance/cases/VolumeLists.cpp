@@ -15,10 +15,11 @@ constexpr int64_t few = 4;
 
 std::vector<ConfigVolume> madeInOrder(Probe &probe) {
     std::vector<ConfigVolume> made;
+    auto spec = probe.freshSpec();
+    auto const beginning = spec.directoryName;
     for (int64_t count = 0; count < few; ++count) {
         // Names that fall as their age rises, so that no order by name looks like the order of making.
-        auto spec = probe.freshSpec();
-        spec.directoryName += '-' + std::to_string(few - count);
+        spec.directoryName = beginning + '-' + std::to_string(few - count);
         auto const volume = probe.make(spec);
         made.push_back({volume.uuid, volume.directoryName, volume.boundTo});
     }

@@ -19,6 +19,8 @@ struct Bug {
     char const *description; ///< one sentence
     char const *caughtBy;    ///< the case of the kit that is there to find it
     std::unique_ptr<Provider> (*put)(std::unique_ptr<Provider> inner, kj::Timer &timer);
+    /// What keeps the case from seeing the bug when the provider is served over HTTPS; null: it is seen there too.
+    char const *hiddenOverHttps = nullptr;
 };
 
 /// All of them, in the order of the interface's operations.
