@@ -7,6 +7,7 @@ which ctest sets.
 
 import os
 import pathlib
+import re
 import shutil
 import signal
 import sqlite3
@@ -46,6 +47,7 @@ class Host:
         self.array = self.root / "arrays" / "small.array"
         self.url = f"file://{self.array}"
         self.daemon = None
+        self.server = None  # of the array, where it is served over HTTPS
         self.status = None  # of a daemon that did not get ready
         self.environment = {k: v for k, v in os.environ.items() if k not in SETTINGS}
         self.environment["TOVI_ROOT"] = str(self.root)
@@ -59,6 +61,9 @@ class Host:
 
     def __exit__(self, *_):
         self.stop()
+        if self.server is not None:
+            self.server.terminate()
+            self.server.wait(timeout=20)
         shutil.rmtree(self.directory, ignore_errors=True)
 
     def run(self, *words, stdin=None, **settings):
@@ -124,6 +129,21 @@ class Host:
             return True
         except subprocess.TimeoutExpired:
             return False
+
+    def serve(self, *options, name="localhost"):
+        """Serves the host's array over HTTPS, under a name that has to be looked up, and lets the host trust it.
+        @return the provider's URL"""
+        ready, certificate = self.directory / "url", self.directory / "cert.pem"
+        os.mkfifo(ready)
+        words = ["serve", "--cert", certificate, "--key", self.directory / "key.pem", "--cert-name", name, *options,
+                 self.array]
+        with ready.open("w+b", buffering=0) as url:
+            self.server = subprocess.Popen([str(programs() / "orkasim"), *map(str, words)], stdin=subprocess.DEVNULL,
+                                           stdout=url)
+            port = re.match(rb"https://[^/]*:(\d+)/", url.readline()).group(1).decode()
+        (self.root / "certs").mkdir(exist_ok=True)
+        shutil.copy(certificate, self.root / "certs" / f"{name}_{port}.pem")
+        return f"https://{name}:{port}/orka"
 
     # What is there, for comparing before and after.
 

@@ -43,19 +43,39 @@ class Units(unittest.TestCase):
     @unittest.skipUnless(sweep.can_trace(), "strace cannot trace here")
     def test_no_call_that_the_daemon_needs_is_filtered(self):
         allowed = self.calls_allowed()
+        lines = self.trace(lambda host: host.url) + self.trace(Host.serve)
+        used = {match.group(1) for match in map(sweep.CALL.match, lines) if match}
+        self.assertLess({"pwrite64", "connect"}, used)
+        # The service manager itself calls execve before the filter holds.
+        self.assertEqual(sorted(used - allowed - {"execve"}), [])
+
+    @unittest.skipUnless(sweep.can_trace(), "strace cannot trace here")
+    def test_its_sockets_are_of_families_that_it_may_have(self):
+        families = re.search(r"^RestrictAddressFamilies=(.+)$", self.service(), re.MULTILINE).group(1).split()
+        self.assertIn("SocketBindDeny=any", self.service().splitlines())
+        # Looking a name up, the C library asks which addresses this host has, and does without an answer: it gets none.
+        told = self.trace(Host.serve, "-e", "inject=getsockname:error=EAFNOSUPPORT")
+        self.assertIn("INJECTED", "".join(told))
+        lines = [line for line in told if "NETLINK" not in line]
+        opened = set(re.findall(r"\bsocket\((AF_\w+)", "\n".join(lines)))
+        self.assertIn("AF_INET", opened)
+        self.assertEqual(sorted(opened - set(families)), [])
+        bound = [line for line in lines if re.search(r"\bbind\(", line) and "AF_UNIX" not in line]
+        self.assertEqual(bound, [])
+
+    def trace(self, url_of, *options):
+        """A daemon's calls while it reaches an array at the URL that a host gives."""
         with Host() as host:
+            url = url_of(host)
             log = host.directory / "trace"
-            self.assertTrue(host.start("strace", "-f", "-o", log))
-            host.done("orkaprovider", "add", "--vp-name", "lab", "--vp-url", host.url)
+            self.assertTrue(host.start("strace", "-f", "-o", log, *options))
+            host.done("orkaprovider", "add", "--vp-name", "lab", "--vp-url", url)
             host.done("storagecontainer", "load")
             host.done("configlumo", "add", "-n", "vm", "-c", GOLD)
             host.done("configlumo", "mount", "-n", "vm", "-c", GOLD)
             host.done("configlumo", "remove", "-n", "vm", "-c", GOLD)
             self.assertEqual(host.stop(), 0)
-            used = {match.group(1) for match in map(sweep.CALL.match, log.read_text().splitlines()) if match}
-        self.assertIn("pwrite64", used)
-        # The service manager itself calls execve before the filter holds.
-        self.assertEqual(sorted(used - allowed - {"execve"}), [])
+            return log.read_text(errors="replace").splitlines()
 
     @unittest.skipUnless(os.geteuid() == 0 and shutil.which("setpriv"), "only root has capabilities to lose")
     def test_the_daemon_needs_no_capability(self):
@@ -69,10 +89,14 @@ class Units(unittest.TestCase):
             host.done("configlumo", "mount", "-n", "vm", "-c", GOLD)
             self.assertEqual(host.stop(), 0)
 
+    @staticmethod
+    def service():
+        return (UNITS / "lumod.service").read_text()
+
     def calls_allowed(self):
         """As the service's SystemCallFilter= lines add and take away."""
         allowed = set()
-        for line in (UNITS / "lumod.service").read_text().splitlines():
+        for line in self.service().splitlines():
             if line.startswith("SystemCallFilter="):
                 words = line.split("=", 1)[1]
                 calls = set().union(*map(self.members, words.lstrip("~").split()))
