@@ -4,6 +4,7 @@
 #include <capnp/serialize.h>
 #include <cerrno>
 #include <cstring>
+#include <poll.h>
 #include <stdexcept>
 #include <sys/socket.h>
 #include <sys/un.h>
@@ -23,6 +24,19 @@ void receive(int fd, void *into, size_t size) {
     if (got != static_cast<ssize_t>(size)) {
         fail("the daemon's reply ended early");
     }
+}
+
+std::vector<std::byte> serialize(RawSession::Fill const &fill) {
+    capnp::MallocMessageBuilder message;
+    auto request = message.initRoot<Wire::Request>();
+    request.setVersion(Wire::PROTOCOL_VERSION);
+    request.setId(1);
+    request.setDeadlineMs(60000);
+    fill(request);
+    auto const words = capnp::messageToFlatArray(message);
+    auto const bytes = words.asBytes();
+    auto const *data = reinterpret_cast<std::byte const *>(bytes.begin());
+    return {data, data + bytes.size()};
 }
 
 } // namespace
@@ -47,22 +61,14 @@ RawSession::~RawSession() {
     close(fd_);
 }
 
-void RawSession::prepare(Fill const &fill, Look const &look) {
-    capnp::MallocMessageBuilder message;
-    auto request = message.initRoot<Wire::Request>();
-    request.setVersion(Wire::PROTOCOL_VERSION);
-    request.setId(1);
-    request.setDeadlineMs(60000);
-    fill(request);
-    auto const words = capnp::messageToFlatArray(message);
-    auto const bytes = words.asBytes();
-    auto const *data = reinterpret_cast<std::byte const *>(bytes.begin());
-    request_.assign(data, data + bytes.size());
-
+size_t RawSession::prepare(Fill const &fill, Look const &look) {
+    request_ = serialize(fill);
+    size_t total = 0;
     send();
     replyCount_ = 0;
     for (bool last = false; !last; ++replyCount_) {
         size_t const size = readMessage();
+        total += size;
         auto const flat =
             kj::arrayPtr(reinterpret_cast<capnp::word const *>(buffer_.data()), size / sizeof(capnp::word));
         capnp::ReaderOptions options;
@@ -77,6 +83,7 @@ void RawSession::prepare(Fill const &fill, Look const &look) {
         }
         last = reply.getLast();
     }
+    return total;
 }
 
 void RawSession::prepare(std::vector<std::byte> request, size_t replyCount) {
@@ -91,6 +98,17 @@ size_t RawSession::ask() {
         total += readMessage();
     }
     return total;
+}
+
+void RawSession::begin(Fill const &fill) {
+    request_ = serialize(fill);
+    replyCount_ = 0;
+    send();
+}
+
+bool RawSession::isAnswered() const {
+    pollfd waited{fd_, POLLIN, 0};
+    return poll(&waited, 1, 0) > 0;
 }
 
 void RawSession::send() {

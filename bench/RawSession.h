@@ -25,11 +25,16 @@ public:
     using Look = std::function<void(Wire::Reply::Reader)>;
 
     /// What ask() sends from now on. Asks once, reading the replies with care, to learn how many there are.
-    void prepare(Fill const &fill, Look const &look = {});
+    /// @return the bytes read
+    size_t prepare(Fill const &fill, Look const &look = {});
     /// The same with a request that was serialized before, and the number of its replies.
     void prepare(std::vector<std::byte> request, size_t replyCount);
     /// Sends the request and reads as many reply messages as the first time. @return the bytes read.
     size_t ask();
+    /// Sends another request and waits for nothing.
+    void begin(Fill const &fill);
+    /// Whether something came, or the connection ended, since.
+    bool isAnswered() const;
     size_t replyCount() const {
         return replyCount_;
     }
