@@ -1,0 +1,113 @@
+# SPDX-License-Identifier: Apache-2.0
+"""What a command costs: from start to exit, in memory, and in durable writes."""
+import os
+import pathlib
+import shutil
+
+from harness.box import SUBTREE, Host, durable_copy, rounds_of, timed
+
+
+def start(suite):
+    """A command from start to exit against a program that does nothing."""
+    rounds = suite.options.rounds or 400
+    with Host(suite.build, suite.options.root_on) as host:
+        host.register()
+        host.lumo("storagecontainer", "load")
+        for name, goal, limit, words in (
+            ("start --version", 1.2, 1.5, ["tovicli", "--version"]),
+            ("start daemon set", 1.6, 2.0, ["tovicli", *SUBTREE, "daemon", "set", "--log-level", "info"]),
+            ("start load, nothing to do", 1.6, 2.0, ["tovicli", *SUBTREE, "storagecontainer", "load"]),
+        ):
+            if suite.wanted(name):
+                command = [suite.build.program("bench_pair"), str(rounds), *words, "--", suite.build.program("bench_nothing")]
+                suite.report.pairs(name, rounds_of(command, host.env), goal, limit)
+
+
+def memory(suite):
+    """The most memory that a command which reads has resident, and what a program that does nothing has."""
+    with Host(suite.build, suite.options.memory_on, suite.topology(3, volumes=1, metadata=10)) as host:
+        host.register()
+        loaded = host.lumo_json("storagecontainer", "load")[0]
+        container = loaded["StorageContainer Id"]
+        path = os.path.join(host.root, "volumes", loaded["StorageContainer Name"])
+        volume = host.lumo_json("storagecontainer", "checklumos", "-p", path)[0]["LumoId"]
+        for name, words in (
+            ("memory load, nothing to do", ["storagecontainer", "load"]),
+            ("memory checklumos", ["storagecontainer", "checklumos", "-p", path]),
+            ("memory virtualvolume get", ["virtualvolume", "get", "-c", container, "-u", volume]),
+            ("memory metadata list", ["virtualvolume", "metadata", "list", "-c", container, "-u", volume]),
+        ):
+            if suite.wanted(name):
+                command = [suite.build.program("bench_pair"), "--memory", "tovicli", *SUBTREE, *words, "--",
+                           suite.build.program("bench_nothing")]
+                peaks = [rounds_of(command, host.env)[0] for _ in range(suite.options.rounds or 5)]
+                suite.report.amounts(name, [ours / 1024 for ours, _ in peaks], "MiB", 10, 10,
+                                     f"a program that does nothing has {max(floor for _, floor in peaks) / 1024:.2f}")
+
+
+def load(suite):
+    """Load with every container mounted already, and what it grows like."""
+    times = []
+    for size in suite.options.sizes:
+        rounds = suite.options.rounds or max(5, 20000 // size)
+        with Host(suite.build, suite.options.memory_on, suite.topology(size)) as host:
+            host.register()
+            host.lumo("storagecontainer", "load")
+            command = [suite.build.program("bench_pair"), str(rounds), "tovicli", *SUBTREE, "storagecontainer", "load", "--",
+                       suite.build.program("bench_nothing")]
+            times.append((size, [ours for ours, _ in rounds_of(command, host.env)]))
+            suite.report.point("containers", "load, all mounted", *times[-1])
+    suite.report.growth("load, all mounted: growth", times, 10.5)
+
+
+def write(suite):
+    """Writing commands against a bare program that commits as many durable transactions to a copy of the same file on the same
+    disk, and asks the daemon once where the command needs it. Each round begins with the files of the first."""
+    with Host(suite.build, suite.options.root_on, suite.topology(1000)) as host:
+        host.register()
+        _write_and_restore(suite, host)
+        if suite.wanted("write configlumo mount") or suite.wanted("write configlumo umount"):
+            _write_config_volume(suite, host, host.lumo_json("storagecontainer", "load")[0]["StorageContainer Id"])
+
+
+def _write_and_restore(suite, host):
+    template = pathlib.Path(suite.scratch) / "template.db"
+    shutil.copy(os.path.join(host.root, "host.db"), template)
+
+    def restore(name):
+        shutil.rmtree(os.path.join(host.root, "volumes"), ignore_errors=True)
+        return durable_copy(template, os.path.join(host.root, name))
+
+    def pair(command, transactions, insert):
+        restore("host.db")
+        ours = timed(["tovicli", *SUBTREE, *command], host.env)
+        return ours, timed([suite.build.program("bench_transactions"), restore("bare.db"), str(transactions), insert], host.env)
+
+    for name, rounds, command, transactions, insert in (
+        ("write provider add", 60, ["orkaprovider", "add", "--vp-name", "new", "--vp-url", "u"], 1,
+         "INSERT INTO provider (name, url, aux_text) VALUES (?1, '', '')"),
+        ("write load of 1000 new containers", 5, ["storagecontainer", "load"], 1000,
+         "INSERT INTO file_system (name, container_id) VALUES (?1, ?2)"),
+    ):
+        if suite.wanted(name):
+            pairs = [pair(command, transactions, insert) for _ in range(suite.options.rounds or rounds)]
+            suite.report.pairs(name, pairs, 1.4, 1.4)
+    restore("host.db")
+
+
+def _write_config_volume(suite, host, container):
+    """A mount and an unmount are one transaction of the host store and one request each, once the volume is bound."""
+    volume = ["--name", "bench", "--container-id", container]
+    for command in ("add", "mount", "umount"):
+        host.lumo("configlumo", command, *volume)
+    template = os.path.join(host.root, "host.db")
+    socket = os.path.join(host.root, "run", "lumod.sock")
+    insert = "INSERT INTO endpoint_outage (uid) VALUES (?1)"
+    pairs = {"mount": [], "umount": []}
+    for _ in range(suite.options.rounds or 60):
+        for command, taken in pairs.items():
+            ours = timed(["tovicli", *SUBTREE, "configlumo", command, *volume], host.env)
+            bare = durable_copy(template, os.path.join(host.root, "bare.db"))
+            taken.append((ours, timed([suite.build.program("bench_transactions"), bare, "1", insert, socket], host.env)))
+    for command, taken in pairs.items():
+        suite.report.pairs(f"write configlumo {command}", taken, 1.4, 1.4)
