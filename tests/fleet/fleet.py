@@ -1,8 +1,8 @@
 # SPDX-License-Identifier: Apache-2.0
 """Three hosts of one storage array: a root and a lumod each, and one orkasim that all of them reach over HTTPS.
 
-lab/up brings them up in a temporary directory; the first of them has the array's server beside its daemon. Programs come
-from TOVI_BUILD_DIR, which ctest sets.
+lab/up brings them up in a temporary directory; the first of them has the array's server beside its daemon. Programs
+come from TOVI_BUILD_DIR, which ctest sets.
 """
 
 import json
@@ -114,8 +114,8 @@ class Host:
     def strangers(self):
         """Files that have no business in a root at rest."""
         known = {"host.db", "run/lumod.lock", "run/lumod.pid", "run/lumod.sock", "run/lumod-priority.sock",
-                 "log/lumod.log", "log/lab.log", "run/lab.daemon", "log/orkasim.log", "run/lab.orkasim", "run/lab.array",
-                 "run/orkasim.url", "run/orkasim.pem", "run/orkasim.key", "arrays/small.array"}
+                 "log/lumod.log", "log/lab.log", "run/lab.daemon", "log/orkasim.log", "run/lab.orkasim",
+                 "run/lab.array", "run/orkasim.url", "run/orkasim.pem", "run/orkasim.key", "arrays/small.array"}
         files = {str(path.relative_to(self.root)) for path in self.root.rglob("*") if not path.is_dir()}
         return sorted(name for name in files - known if not name.startswith(("volumes/", "lumos/", "certs/")))
 
@@ -167,8 +167,8 @@ class Fleet:
     def volumes(self, container):
         """Each config volume by id: size and committed size in MB."""
         return {uuid: (size, committed) for uuid, size, committed in query(
-            self.array, "SELECT v.uuid, v.size_mb, v.committed_mb FROM volume v JOIN container c ON c.seq = v.container "
-                        f"WHERE c.name = '{container}' AND v.directory_name IS NOT NULL")}
+            self.array, "SELECT v.uuid, v.size_mb, v.committed_mb FROM volume v JOIN container c "
+                        f"ON c.seq = v.container WHERE c.name = '{container}' AND v.directory_name IS NOT NULL")}
 
     def names(self, container):
         return {name for name, in query(

@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Three hosts at work on one array at once, with daemons that are killed in the middle: nothing that was acknowledged is
-lost, nothing is there that nobody made, and at the end every host sees what the array holds.
+"""Three hosts at work on one array at once, with daemons that are killed in the middle: nothing that was acknowledged
+is lost, nothing is there that nobody made, and at the end every host sees what the array holds.
 
 TOVI_LONG=1 makes the work longer and kills more often.
 """
@@ -111,7 +111,7 @@ class Load(unittest.TestCase):
                     path = worker.host.root / "volumes" / container / name / "content"
                     self.assertEqual(path.read_text(), name)
 
-        # Half of it is removed by the host that has it, half by the next one first: then its host lets go of what is left.
+        # Half of it is removed by the host that has it, half by the next one first: its host lets go of what is left.
         for worker in workers:
             for container, names in worker.kept.items():
                 for name in sorted(names):
