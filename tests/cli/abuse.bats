@@ -26,7 +26,7 @@ setup() {
     export TOVI_OFFLINE=1
     lumo orkaprovider add --vp-name $'lab\xff' --vp-url u
     expect_failure 2 'lab\xff'
-    ! LC_ALL=C grep -q $'\xff' "$err"
+    LC_ALL=C run ! grep -q $'\xff' "$err"
     [ ! -e "$TOVI_ROOT/host.db" ]
 }
 
@@ -37,7 +37,7 @@ setup() {
     tovicli storage internal lumo orkaprovider add --vp-name second --vp-url u <&- >&- 2>&- || status=$?
     [ "$status" -ne 0 ]
     [ "$(sqlite3 "$TOVI_ROOT/host.db" 'PRAGMA integrity_check')" = ok ]
-    ! grep -aq "Succesfully" "$TOVI_ROOT/host.db"
+    run ! grep -aq "Succesfully" "$TOVI_ROOT/host.db"
 }
 
 @test "fault_31 a daemon that stands still: the tool ends at its deadline" {

@@ -189,6 +189,36 @@ os._exit(0)' "$TOVI_ROOT/host.db"
     expect_check "provider good" ok "serves 3 containers"
 }
 
+@test "a provider elsewhere: served, gone, beside one that serves, and with nobody to ask" {
+    TOVI_LAB_HTTPS=1 mounted_host
+    url="$LUMO_ARRAY_URL"
+    [[ "$url" == https://* ]]
+    doctor 0
+    expect_err ""
+    expect_json 'all(c["State"] == "ok" for c in d)'
+    expect_check "provider lab" ok "$url serves 3 containers of array-north, array-south"
+
+    read -r orkasim _ <"$TOVI_ROOT/run/lab.orkasim"
+    kill -KILL "$orkasim"
+    timeout 10 tail --pid "$orkasim" -f /dev/null 3>&-
+    doctor 1
+    expect_check daemon ok
+    expect_check containers fail "cannot be reached"
+    expect_check "provider lab" warn "$url: nobody could be asked whether it is reached"
+
+    orkasim make "$top/lab/topologies/small.json" "$TOVI_ROOT/arrays/other.array"
+    register_provider near "file://$TOVI_ROOT/arrays/other.array"
+    doctor 0
+    expect_check "provider near" ok "serves 3 containers"
+    expect_check "provider lab" warn "$url serves no container: it cannot be reached, exports none, or another provider is active for its arrays"
+
+    host_down
+    doctor 1
+    expect_check socket fail "does not exist: no daemon was started on this root"
+    expect_check "provider lab" warn "$url: nobody could be asked whether it is reached"
+    expect_check "provider near" ok "nobody could be asked whether it is served"
+}
+
 @test "an endpoint in an outage, and a mounted container that nobody exports" {
     mounted_host
     lumo daemon set --start-pe-apd "$endpoint"

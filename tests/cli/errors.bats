@@ -106,7 +106,8 @@ sys.exit(0 if eval(sys.argv[2]) is True else f"{sys.argv[2]}: {d}")' "$err" "$1"
     kill -STOP "$stopped"
     timed storagecontainer load --timeout 700ms
     expect_failure 3 "gave no answer within 700 ms" "(--timeout gives it more time)"
-    [ "$milliseconds" -ge 700 ] && [ "$milliseconds" -lt 2500 ]
+    [ "$milliseconds" -ge 700 ]
+    [ "$milliseconds" -lt 2500 ]
 }
 
 @test "a store of a newer release, or of another program's, is told with what to do" {

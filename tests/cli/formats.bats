@@ -10,7 +10,10 @@ setup() {
 
 # piped FORMAT EXPRESSION ARGS...: what the expression makes of the document that the command wrote into a pipe.
 piped() {
-    tovicli --format "$1" storage internal lumo "${@:3}" 2>"$err" | python3 "$top/tests/cli/formats.py" "$1" "$2"
+    (
+        set -o pipefail
+        tovicli --format "$1" storage internal lumo "${@:3}" 2>"$err" | python3 "$top/tests/cli/formats.py" "$1" "$2"
+    )
 }
 
 @test "json: containers with their types" {

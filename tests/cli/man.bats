@@ -44,7 +44,8 @@ quiet() {
         terminal_run -w "$width" -e TOVI_OFFLINE=1 -- tovicli storage internal lumo daemon set --help
         expect_status 0
         longest="$(wc -L <"$screen")"
-        [ "$longest" -le "$width" ] && [ "$longest" -gt $((width - 20)) ]
+        [ "$longest" -le "$width" ]
+        [ "$longest" -gt $((width - 20)) ]
     done
     grep -qE '^      --end-pe-apd TEXT +Simulate PE APD end for a given PE\.' "$screen"
 }

@@ -141,7 +141,7 @@ EOF_OUT
     lumo storagecontainer load
     expect_status 0
     expect_out_has 'Name: a\x1b[31m\r\u202e'
-    ! LC_ALL=C grep -q $'\e' "$out"
+    LC_ALL=C run ! grep -q $'\e' "$out"
 }
 
 @test "fault_63 output that cannot be written is status 4, and what was done is done" {

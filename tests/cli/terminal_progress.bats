@@ -44,7 +44,8 @@ silent_daemon() {
 
     # What was loaded before is not counted again.
     loaded="$(sqlite3 "$TOVI_ROOT/host.db" 'SELECT count(*) FROM file_system')"
-    [ "$loaded" -gt 0 ] && [ "$loaded" -lt 2000 ]
+    [ "$loaded" -gt 0 ]
+    [ "$loaded" -lt 2000 ]
     terminal_start -- tovicli storage internal lumo storagecontainer load
     terminal_expect " of $((2000 - loaded)) done"
     terminal_keys C-c

@@ -14,7 +14,7 @@ teardown() {
     cd "$top"
     export TMPDIR="$BATS_TEST_TMPDIR"
     python3 "$BATS_TEST_DIRNAME/run_tour.py" docs/tour.md 3>&- >&2
-    ! compgen -G "$BATS_TEST_TMPDIR/tovi-lab.*"
+    run ! compgen -G "$BATS_TEST_TMPDIR/tovi-lab.*"
 }
 
 @test "every command is in the tour" {
