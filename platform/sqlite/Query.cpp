@@ -39,17 +39,6 @@ Query &Query::bind(int parameter, std::string_view value) {
     return *this;
 }
 
-Query &Query::bindBlob(int parameter, std::string_view bytes) {
-    try {
-        // A null pointer would bind NULL.
-        statement_->bind(parameter, bytes.empty() ? static_cast<void const *>("") : bytes.data(),
-                         static_cast<int>(bytes.size()));
-    } catch (SQLite::Exception const &cause) {
-        database_->fail(cause);
-    }
-    return *this;
-}
-
 Query &Query::bindNull(int parameter) {
     try {
         statement_->bind(parameter);
@@ -98,14 +87,6 @@ std::string_view Query::textView(int column) const {
     return this->column(column, [](SQLite::Column const &value) {
         char const *const text = value.getText();
         return std::string_view(text, static_cast<std::size_t>(value.getBytes()));
-    });
-}
-
-std::string_view Query::blob(int column) const {
-    return this->column(column, [](SQLite::Column const &value) {
-        auto const *const bytes = static_cast<char const *>(value.getBlob());
-        return bytes == nullptr ? std::string_view()
-                                : std::string_view(bytes, static_cast<std::size_t>(value.getBytes()));
     });
 }
 

@@ -27,7 +27,6 @@ public:
     Query &bind(int parameter, int64_t value);
     /// Copies the text.
     Query &bind(int parameter, std::string_view value);
-    Query &bindBlob(int parameter, std::string_view bytes);
     Query &bindNull(int parameter);
 
     /// @return true when there is a row to read, false at the end.
@@ -41,8 +40,6 @@ public:
     std::string text(int column) const;
     /// Valid until the next step() or reset().
     std::string_view textView(int column) const;
-    /// Valid until the next step() or reset().
-    std::string_view blob(int column) const;
     bool isNull(int column) const;
 
 private:
