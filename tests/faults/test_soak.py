@@ -161,15 +161,15 @@ class Soak(unittest.TestCase):
         with Host() as box:
             daemon = self.serve(box)
             reads = [
-                "storage internal lumo faultInjection enable --enabled true",
+                *["storage internal lumo faultInjection enable --enabled true"] * 6,
+                *["storage internal lumo nothing"] * 6,
+                *["an 'open quote"] * 3,
                 "storage internal lumo daemon set --log-level info",
                 "storage internal lumo storagecontainer load",
                 f"--format json storage internal lumo configlumo mount -n none -c {GOLD}",
                 "storage internal lumo storagecontainer load --help",
                 "cli describe storage internal lumo orkaprovider add",
-                "storage internal lumo nothing",
-                "an 'open quote",
-            ] * 250
+            ] * 100
             add, mount, unmount, remove = (f"storage internal lumo configlumo {verb} -n vm -c {GOLD}"
                                            for verb in ("add", "mount", "umount", "remove"))
             batch = [*reads, add, mount, *reads, unmount, remove]
@@ -187,7 +187,7 @@ class Soak(unittest.TestCase):
                     if done % (batches // 4) == 0:
                         marks.take()
                 shell.stdin.close()
-                self.assertEqual(shell.wait(timeout=60), 1)
+                self.assertEqual(shell.wait(timeout=60), 2)  # of the first line that failed
                 self.assertEqual((told.end(), complained.end()), (batches * out, batches * err))
             marks.hold(self)
             self.assertEqual(box.stop(), 0)
