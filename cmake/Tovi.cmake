@@ -32,9 +32,10 @@ else()
 endif()
 
 if(TOVI_COVERAGE)
-  # Four files a binary, which its processes take turns to add to.
-  set(profiles "${CMAKE_BINARY_DIR}/profiles/%4m.profraw")
-  add_compile_options(-fprofile-instr-generate=${profiles} -fcoverage-mapping)
+  # One file a binary, which is the memory that its processes count in (%c): what a process does that is killed, or that
+  # leaves by _exit, is counted too.
+  set(profiles "${CMAKE_BINARY_DIR}/profiles/%c%m.profraw")
+  add_compile_options(-fprofile-instr-generate=${profiles} -fcoverage-mapping "SHELL:-mllvm -runtime-counter-relocation")
   add_link_options(-fprofile-instr-generate=${profiles})
 endif()
 
