@@ -2,6 +2,7 @@
 #include "JsonReading.h"
 
 #include <algorithm>
+#include <charconv>
 
 #include <fmt/format.h>
 #include <rapidjson/error/en.h>
@@ -17,6 +18,42 @@ constexpr size_t quotedCharactersMax = 80;
 
 bool isNamed(rapidjson::Value::Member const &member, std::string_view name) {
     return std::string_view(member.name.GetString(), member.name.GetStringLength()) == name;
+}
+
+/// The code unit that an escape stands for: the four digits behind "\\u" in a document that was parsed.
+unsigned unitAt(std::string_view json, size_t digits) {
+    unsigned unit = 0;
+    std::from_chars(json.data() + digits, json.data() + digits + 4, unit, 16);
+    return unit;
+}
+
+/// Where the second half of a surrogate pair is escaped without the first; the parser makes bytes of it that are no
+/// UTF-8. Takes a document that was parsed.
+std::optional<size_t> loneSurrogate(std::string_view json) {
+    size_t at = json.find('\\');
+    while (at != std::string_view::npos) {
+        size_t length = 2;
+        if (json[at + 1] == 'u') {
+            unsigned const unit = unitAt(json, at + 2);
+            if (unit >= 0xDC00 && unit <= 0xDFFF) {
+                return at;
+            }
+            bool const beginsPair = unit >= 0xD800 && unit <= 0xDBFF; // the parser has seen its other half
+            length = beginsPair ? 12 : 6;
+        }
+        at = json.find('\\', at + length);
+    }
+    return std::nullopt;
+}
+
+[[noreturn]] void failParsing(std::string_view json, std::string const &sourceName, rapidjson::ParseErrorCode code,
+                              size_t offset) {
+    auto const before = json.substr(0, std::min(offset, json.size()));
+    auto const lineStart = before.rfind('\n');
+    auto const line = std::count(before.begin(), before.end(), '\n') + 1;
+    auto const column = lineStart == std::string_view::npos ? before.size() + 1 : before.size() - lineStart;
+    throw Wire::Failure(Wire::ErrorCode::InvalidArgument, fmt::format("{}: line {}, column {}: {}", sourceName, line,
+                                                                      column, rapidjson::GetParseError_En(code)));
 }
 
 } // namespace
@@ -44,18 +81,18 @@ std::string quoted(std::string_view text) {
 
 void parseJson(std::string_view json, std::string const &sourceName, rapidjson::Document &document) {
     rapidjson::MemoryStream stream(json.data(), json.size());
-    // Iterative: nesting costs no stack.
-    constexpr unsigned flags =
-        rapidjson::kParseIterativeFlag | rapidjson::kParseValidateEncodingFlag | rapidjson::kParseFullPrecisionFlag;
+    // Iterative: nesting costs no stack. Not in full precision, which is undefined for 0e300: what is no whole number
+    // is refused anyway.
+    constexpr unsigned flags = rapidjson::kParseIterativeFlag | rapidjson::kParseValidateEncodingFlag;
     document.ParseStream<flags, rapidjson::UTF8<>>(stream);
     if (document.HasParseError()) {
-        auto const before = json.substr(0, std::min(document.GetErrorOffset(), json.size()));
-        auto const lineStart = before.rfind('\n');
-        auto const line = std::count(before.begin(), before.end(), '\n') + 1;
-        auto const column = lineStart == std::string_view::npos ? before.size() + 1 : before.size() - lineStart;
-        throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
-                            fmt::format("{}: line {}, column {}: {}", sourceName, line, column,
-                                        rapidjson::GetParseError_En(document.GetParseError())));
+        failParsing(json, sourceName, document.GetParseError(), document.GetErrorOffset());
+    }
+    if (stream.Tell() < json.size()) { // at a NUL, which the parser takes for the end
+        failParsing(json, sourceName, rapidjson::kParseErrorDocumentRootNotSingular, stream.Tell());
+    }
+    if (std::optional<size_t> const lone = loneSurrogate(json)) {
+        failParsing(json, sourceName, rapidjson::kParseErrorStringUnicodeSurrogateInvalid, *lone);
     }
 }
 
