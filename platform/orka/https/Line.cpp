@@ -127,21 +127,19 @@ kj::Promise<Outcome<kj::Own<Connection>>> Line::open(std::shared_ptr<Step> step)
 kj::Promise<Outcome<kj::Own<Connection>>> Line::secure(kj::Own<kj::AsyncIoStream> stream, std::shared_ptr<Step> step) {
     using Result = Outcome<kj::Own<Connection>>;
     *step = Step::ShakingHands;
-    auto context = outcomeOf([this] { return &trust_.context(); });
-    if (!context.ok()) {
-        return Result(context.failure());
+    auto securing = outcomeOf([&] { return trust_.secure(kj::mv(stream)); });
+    if (!securing.ok()) {
+        return Result(securing.failure());
     }
-    return context.value()
-        ->wrapClient(kj::mv(stream), url_.host.c_str())
-        .then(
-            [this, step](kj::Own<kj::AsyncIoStream> &&secured) -> Result {
-                *step = Step::Connected;
-                auto connection = kj::heap<Connection>();
-                connection->client = kj::newHttpClient(headers(), *secured);
-                connection->stream = kj::mv(secured);
-                return Result(kj::mv(connection));
-            },
-            [this, step](kj::Exception &&exception) -> Result { return unreachable(*step, exception); });
+    return std::move(securing).value().then(
+        [this, step](kj::Own<kj::AsyncIoStream> &&secured) -> Result {
+            *step = Step::Connected;
+            auto connection = kj::heap<Connection>();
+            connection->client = kj::newHttpClient(headers(), *secured);
+            connection->stream = kj::mv(secured);
+            return Result(kj::mv(connection));
+        },
+        [this, step](kj::Exception &&exception) -> Result { return unreachable(*step, exception); });
 }
 
 void Line::keep(kj::Own<Connection> connection) {

@@ -53,7 +53,8 @@ std::string contentOf(std::string const &path) {
 
 } // namespace
 
-Trust::Trust(std::string const &directory, Url const &url) {
+Trust::Trust(std::string const &directory, Url const &url)
+    : host_(url.host) {
     if (!directory.empty()) {
         path_ = directory + '/' + url.host + '_' + std::to_string(url.port) + ".pem";
     }
@@ -76,6 +77,10 @@ std::optional<Trust::Stamp> Trust::stampOfFile() const {
         throw malformed(path_);
     }
     return Stamp{status.st_ino, status.st_size, status.st_mtim.tv_sec, status.st_mtim.tv_nsec};
+}
+
+kj::Promise<kj::Own<kj::AsyncIoStream>> Trust::secure(kj::Own<kj::AsyncIoStream> stream) {
+    return context().wrapClient(kj::mv(stream), host_.c_str());
 }
 
 kj::TlsContext &Trust::context() {

@@ -11,6 +11,7 @@
 #include <optional>
 #include <string>
 
+#include <kj/async-io.h>
 #include <kj/compat/tls.h>
 
 #include "https/Url.h"
@@ -22,9 +23,10 @@ public:
     /// @param directory where pinned certificates are; empty: none are
     Trust(std::string const &directory, Url const &url);
 
+    /// TLS over a connection to the provider; rejected when its certificate is not to be trusted.
     /// @throws Wire::Failure FileMalformed when the pinned file holds no certificate, IoError when it cannot be read
-    kj::TlsContext &context();
-    /// The next context reads the system's store anew.
+    kj::Promise<kj::Own<kj::AsyncIoStream>> secure(kj::Own<kj::AsyncIoStream> stream);
+    /// The next connection reads the system's store anew.
     void forget() {
         context_.reset();
     }
@@ -43,7 +45,9 @@ private:
         bool operator==(Stamp const &) const = default;
     };
     std::optional<Stamp> stampOfFile() const;
+    kj::TlsContext &context();
 
+    std::string host_;
     std::string path_;
     std::optional<Stamp> stamp_; ///< of the file that the context was made of; nothing: of the system's store
     std::unique_ptr<kj::TlsContext> context_;
