@@ -109,9 +109,34 @@ private:
         return access((store_.path() + "-journal").c_str(), F_OK) != 0;
     }
 
+    template <typename Entry>
+    std::vector<Entry> stored(std::vector<Entry> (Store::HostStore::*read)()) {
+        return mayReadStore() ? (store_.*read)() : std::vector<Entry>();
+    }
+
+    /// What providers export, as the daemon tells it.
+    template <typename Visit>
+    void eachContainer(Visit visit) const {
+        Session const session(query_);
+        Containers const containers = session.containers();
+        for (uint32_t i = 0; containers != nullptr && i < containers->containerCount; ++i) {
+            visit(*containers->containers[i]);
+        }
+    }
+
+    /// The arrays of all containers, one as often as containers lie on it.
+    template <typename Visit>
+    void eachArray(Visit visit) const {
+        eachContainer([&](StorageContainerInfo const &container) {
+            for (int32_t i = 0; i < container.arrayCount; ++i) {
+                visit(*container.arrays[i]);
+            }
+        });
+    }
+
     Candidates providers() {
         Candidates found;
-        for (Store::Provider const &provider : mayReadStore() ? store_.providers() : std::vector<Store::Provider>()) {
+        for (Store::Provider const &provider : stored(&Store::HostStore::providers)) {
             bool const byUrl = query_.live == Live::ProviderUrls;
             found.push_back(byUrl ? Candidate{provider.url, provider.name} : Candidate{provider.name, provider.url});
         }
@@ -121,18 +146,12 @@ private:
     Candidates arrays() {
         Candidates found;
         std::set<std::string> seen;
-        Session const session(query_);
-        Containers const containers = session.containers();
-        for (uint32_t i = 0; containers != nullptr && i < containers->containerCount; ++i) {
-            StorageContainerInfo const &container = *containers->containers[i];
-            for (int32_t k = 0; k < container.arrayCount; ++k) {
-                StorageArrayInfo const &array = *container.arrays[k];
-                if (seen.insert(array.arrayId).second) {
-                    found.push_back({array.arrayId, std::string(array.name) + ", " + array.vendorId});
-                }
+        eachArray([&](StorageArrayInfo const &array) {
+            if (seen.insert(array.arrayId).second) {
+                found.push_back({array.arrayId, std::string(array.name) + ", " + array.vendorId});
             }
-        }
-        for (Store::Provider const &provider : mayReadStore() ? store_.providers() : std::vector<Store::Provider>()) {
+        });
+        for (Store::Provider const &provider : stored(&Store::HostStore::providers)) {
             for (Store::ProviderArray const &array : provider.arrays) {
                 if (seen.insert(array.arrayId).second) {
                     found.push_back({array.arrayId, "of provider " + provider.name});
@@ -144,28 +163,25 @@ private:
 
     Candidates exported() {
         std::set<std::string> mountedIds;
-        for (Store::FileSystem const &each : mayReadStore() ? store_.fileSystems() : std::vector<Store::FileSystem>()) {
+        for (Store::FileSystem const &each : stored(&Store::HostStore::fileSystems)) {
             mountedIds.insert(each.containerId);
         }
         Candidates found;
-        Session const session(query_);
-        Containers const containers = session.containers();
-        for (uint32_t i = 0; containers != nullptr && i < containers->containerCount; ++i) {
-            StorageContainerInfo const &container = *containers->containers[i];
+        eachContainer([&](StorageContainerInfo const &container) {
             bool const isMounted = mountedIds.contains(container.id);
             if (query_.live == Live::ExportedContainers) {
                 found.push_back({container.id, std::string(container.name) + (isMounted ? ", mounted" : "")});
             } else if (!isMounted) {
                 found.push_back({container.name, container.id});
             }
-        }
+        });
         return found;
     }
 
     Candidates mounted() {
         Candidates found;
         std::string const volumes = Wire::Paths(query_.root).volumes();
-        for (Store::FileSystem const &each : mayReadStore() ? store_.fileSystems() : std::vector<Store::FileSystem>()) {
+        for (Store::FileSystem const &each : stored(&Store::HostStore::fileSystems)) {
             bool const byPath = query_.live == Live::MountedPaths;
             found.push_back(byPath ? Candidate{volumes + "/" + each.name, each.containerId}
                                    : Candidate{each.containerId, each.name});
@@ -176,11 +192,8 @@ private:
     /// Volumes that this host has a directory of.
     Candidates volumes() {
         Candidates found;
-        if (!mayReadStore()) {
-            return found;
-        }
         std::optional<std::string> const container = Wire::normalizeContainerId(query_.containerId);
-        for (Store::Volume const &volume : store_.volumes()) {
+        for (Store::Volume const &volume : stored(&Store::HostStore::volumes)) {
             bool const isMounted = volume.state == Store::VolumeState::Mounted ||
                                    volume.state == Store::VolumeState::Mounting; // not settled yet
             if (volume.state == Store::VolumeState::Removing) {
@@ -202,7 +215,7 @@ private:
             }
         }
         Candidates found;
-        for (Store::Volume const &volume : mayReadStore() ? store_.volumes() : std::vector<Store::Volume>()) {
+        for (Store::Volume const &volume : stored(&Store::HostStore::volumes)) {
             found.push_back({volume.uuid, volume.directoryName});
         }
         return found;
@@ -211,26 +224,20 @@ private:
     Candidates endpoints() {
         Candidates found;
         std::set<std::string> seen;
-        Session const session(query_);
-        Containers const containers = session.containers();
-        for (uint32_t i = 0; containers != nullptr && i < containers->containerCount; ++i) {
-            StorageContainerInfo const &container = *containers->containers[i];
-            for (int32_t k = 0; k < container.arrayCount; ++k) {
-                StorageArrayInfo const &array = *container.arrays[k];
-                for (int32_t e = 0; e < array.endpointCount; ++e) {
-                    char const *const uid = array.endpoints[e]->localUID;
-                    if (uid != nullptr && seen.insert(uid).second) {
-                        found.push_back({uid, array.arrayId});
-                    }
+        eachArray([&](StorageArrayInfo const &array) {
+            for (int32_t i = 0; i < array.endpointCount; ++i) {
+                char const *const uid = array.endpoints[i]->localUID;
+                if (uid != nullptr && seen.insert(uid).second) {
+                    found.push_back({uid, array.arrayId});
                 }
             }
-        }
+        });
         return found;
     }
 
     Candidates outages() {
         Candidates found;
-        for (std::string const &uid : mayReadStore() ? store_.endpointOutages() : std::vector<std::string>()) {
+        for (std::string const &uid : stored(&Store::HostStore::endpointOutages)) {
             found.push_back({uid});
         }
         return found;

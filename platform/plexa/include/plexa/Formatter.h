@@ -6,15 +6,14 @@
 // A new format is one file in format/ with one function, and one line in the table in Formatters.cpp.
 #pragma once
 
-#include <exception>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include <boost/shared_ptr.hpp>
 
 #include "plexa/FormatSettings.h"
 #include "plexa/MetaObj.h"
+#include "plexa/SentenceError.h"
 #include "plexa/Sink.h"
 
 namespace Plexa {
@@ -26,19 +25,9 @@ struct Result {
 };
 
 /// A result that a format cannot hold. The sentence names the format and the field, ready to be shown.
-class FormatError : public std::exception {
+class FormatError : public SentenceError {
 public:
-    explicit FormatError(std::string sentence)
-        : sentence_(std::move(sentence)) {}
-    std::string const &sentence() const noexcept {
-        return sentence_;
-    }
-    char const *what() const noexcept override {
-        return sentence_.c_str();
-    }
-
-private:
-    std::string sentence_;
+    using SentenceError::SentenceError;
 };
 
 struct Format {

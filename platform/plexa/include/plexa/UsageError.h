@@ -1,28 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <exception>
 #include <string>
 #include <string_view>
-#include <utility>
 #include <vector>
+
+#include "plexa/SentenceError.h"
 
 namespace Plexa {
 
-/// A mistake in the command line. The sentence is ready to be shown: what came from outside is escaped in it.
-class UsageError : public std::exception {
+/// A mistake in the command line.
+class UsageError : public SentenceError {
 public:
-    explicit UsageError(std::string sentence)
-        : sentence_(std::move(sentence)) {}
-    std::string const &sentence() const noexcept {
-        return sentence_;
-    }
-    char const *what() const noexcept override {
-        return sentence_.c_str();
-    }
-
-private:
-    std::string sentence_;
+    using SentenceError::SentenceError;
 };
 
 /// A word of the user's between single quotes: escaped, and cut when it is too long to be read.
