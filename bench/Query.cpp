@@ -88,29 +88,30 @@ size_t sizeOf(StorageContainerResult const &result) {
     return size;
 }
 
-/// A figure of /proc/self/status in bytes.
-size_t memoryFigure(std::string const &name) {
-    std::ifstream status("/proc/self/status");
-    for (std::string line; std::getline(status, line);) {
+/// A figure of /proc/self/FILE in bytes.
+size_t memoryFigure(std::string const &file, std::string const &name) {
+    std::ifstream figures("/proc/self/" + file);
+    for (std::string line; std::getline(figures, line);) {
         if (line.compare(0, name.size() + 1, name + ":") == 0) {
             return std::strtoull(line.c_str() + name.size() + 1, nullptr, 10) * 1024;
         }
     }
-    throw std::runtime_error("/proc/self/status does not tell " + name);
+    throw std::runtime_error("/proc/self/" + file + " does not tell " + name);
 }
 
 /// Resident memory, so that it does not matter where a library gets its own from. The first answer brings in code and
-/// whatever else is kept, and is given back.
+/// whatever else is kept, and is given back. What a result takes is read from the page tables: the counters behind
+/// `status` may be a hundred pages late, which is more than a thousand containers need.
 void printMemory() {
     LumoLib_FreeStorageContainerResult(query());
     malloc_trim(0);
     std::ofstream("/proc/self/clear_refs") << 5; // the peak begins anew
-    size_t const before = memoryFigure("RssAnon");
-    size_t const residentBefore = memoryFigure("VmRSS");
+    size_t const before = memoryFigure("smaps_rollup", "Anonymous");
+    size_t const residentBefore = memoryFigure("status", "VmRSS");
     StorageContainerResult *const result = query();
     malloc_trim(0); // what the answer came through is not of the records
-    size_t const taken = memoryFigure("RssAnon") - before;
-    size_t const peak = memoryFigure("VmHWM") - residentBefore;
+    size_t const taken = memoryFigure("smaps_rollup", "Anonymous") - before;
+    size_t const peak = memoryFigure("status", "VmHWM") - residentBefore;
     std::printf("%zu %zu %zu\n", sizeOf(*result), taken, peak);
     LumoLib_FreeStorageContainerResult(result);
 }
