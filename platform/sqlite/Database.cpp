@@ -2,9 +2,9 @@
 #include "sqlite/Database.h"
 
 #include <cerrno>
+#include <new>
 #include <utility>
 
-#include <SQLiteCpp/SQLiteCpp.h>
 #include <fcntl.h>
 #include <sqlite3.h>
 #include <sys/stat.h>
@@ -54,62 +54,64 @@ Database::Database(std::string const &path, Identity const &identity, Mode mode,
         throw Error(ErrorKind::Missing, named(identity.kindName, path) + " cannot be opened: no such file name");
     }
     open(options, false);
-    try {
-        checkIdentity();
-        configure();
-    } catch (SQLite::Exception const &cause) {
-        fail(cause);
-    }
+    checkIdentity();
+    configure();
 }
 
 Database::~Database() = default;
 
+void Database::Close::operator()(sqlite3 *handle) const noexcept {
+    sqlite3_close(handle);
+}
+
 void Database::open(Options const &options, bool openedAgain) {
-    int flags = SQLite::OPEN_READWRITE | SQLite::OPEN_NOMUTEX;
+    int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX;
     if (mode_ == Mode::Create) {
-        flags |= SQLite::OPEN_CREATE;
+        flags |= SQLITE_OPEN_CREATE;
     }
-    try {
-        handle_ =
-            std::make_unique<SQLite::Database>(fileName(path_), flags, static_cast<int>(options.busyTimeout.count()));
-        sqlite3_extended_result_codes(handle_->getHandle(), 1);
-    } catch (SQLite::Exception const &cause) {
-        int const reason = whyNotOpen(path_);
-        if (reason == 0 && cause.getErrorCode() == SQLITE_CANTOPEN && !openedAgain) {
-            // There is a file by now: another process has made it since SQLite looked.
-            open(options, true);
-            return;
-        }
-        if (reason == ENOENT && mode_ != Mode::Create) {
-            throw Error(ErrorKind::Missing, named(identity_.kindName, path_) + " does not exist");
-        }
-        if (reason == ENOENT && !mayMakeFileBeside(path_)) {
-            throw Error(ErrorKind::ReadOnly, named(identity_.kindName, path_) +
-                                                 " cannot be made: its directory or its file system is read-only");
-        }
-        throw explain(cause.getExtendedErrorCode(), reason, cause.what(), named(identity_.kindName, path_),
-                      busyTimeout_);
+    sqlite3 *opened = nullptr; // also when it fails, to ask why
+    int const code = sqlite3_open_v2(fileName(path_).c_str(), &opened, flags, nullptr);
+    handle_.reset(opened);
+    if (code == SQLITE_OK) {
+        sqlite3_extended_result_codes(opened, 1);
+        sqlite3_busy_timeout(opened, static_cast<int>(options.busyTimeout.count()));
+        return;
     }
+    int const reason = whyNotOpen(path_);
+    if (reason == 0 && code == SQLITE_CANTOPEN && !openedAgain) {
+        // There is a file by now: another process has made it since SQLite looked.
+        open(options, true);
+        return;
+    }
+    if (reason == ENOENT && mode_ != Mode::Create) {
+        throw Error(ErrorKind::Missing, named(identity_.kindName, path_) + " does not exist");
+    }
+    if (reason == ENOENT && !mayMakeFileBeside(path_)) {
+        throw Error(ErrorKind::ReadOnly, named(identity_.kindName, path_) +
+                                             " cannot be made: its directory or its file system is read-only");
+    }
+    throw explain(sqlite3_extended_errcode(opened), reason, sqlite3_errmsg(opened), named(identity_.kindName, path_),
+                  busyTimeout_);
 }
 
 void Database::checkIdentity() {
     auto const name = [this] { return named(identity_.kindName, path_); };
-    Header header = readHeader(handle_->getHandle());
+    Header header = readHeader(handle_.get());
     bool const maybeOurs = header.kind == Header::Kind::Zeros ||
                            (header.kind == Header::Kind::Database && header.applicationId == identity_.applicationId);
     // Asked after the header was read: a journal that is gone by now had committed what the header says.
-    char const *const journal = sqlite3_filename_journal(sqlite3_db_filename(handle_->getHandle(), "main"));
+    char const *const journal = sqlite3_filename_journal(sqlite3_db_filename(handle_.get(), "main"));
     if (maybeOurs && exists(journal)) {
         // Any read rolls back what a killed process left, which may be all there is: its first transaction.
         Query(*this, "SELECT count(*) FROM sqlite_schema").step();
-        header = readHeader(handle_->getHandle());
+        header = readHeader(handle_.get());
     }
     if (header.kind == Header::Kind::Empty) {
         if (mode_ != Mode::Create) {
             throw Error(ErrorKind::Missing, name() + " has no content yet");
         }
         createLayout();
-        header = readHeader(handle_->getHandle());
+        header = readHeader(handle_.get());
     }
     if (header.kind != Header::Kind::Database) {
         throw Error(ErrorKind::Malformed, name() + " is damaged: it does not begin as a database file does");
@@ -130,7 +132,7 @@ void Database::checkIdentity() {
 }
 
 void Database::createLayout() {
-    handle_->exec("PRAGMA journal_mode=DELETE; PRAGMA synchronous=EXTRA");
+    execute("PRAGMA journal_mode=DELETE; PRAGMA synchronous=EXTRA");
     Transaction transaction(*this);
     // Two processes may have found the file empty; the second one finds the layout made.
     Query tables(*this, "SELECT count(*) FROM sqlite_schema");
@@ -139,21 +141,21 @@ void Database::createLayout() {
         return;
     }
     tables.reset();
-    handle_->exec("PRAGMA application_id=" + std::to_string(identity_.applicationId));
-    handle_->exec("PRAGMA user_version=" + std::to_string(identity_.userVersion));
-    handle_->exec(identity_.schema);
+    execute("PRAGMA application_id=" + std::to_string(identity_.applicationId));
+    execute("PRAGMA user_version=" + std::to_string(identity_.userVersion));
+    execute(identity_.schema);
     transaction.commit();
 }
 
 void Database::configure() {
-    handle_->exec("PRAGMA journal_mode=DELETE;"
-                  "PRAGMA synchronous=EXTRA;"
-                  "PRAGMA foreign_keys=ON;"
-                  "PRAGMA temp_store=MEMORY;"
-                  "PRAGMA cell_size_check=ON;"
-                  "PRAGMA trusted_schema=OFF");
+    execute("PRAGMA journal_mode=DELETE;"
+            "PRAGMA synchronous=EXTRA;"
+            "PRAGMA foreign_keys=ON;"
+            "PRAGMA temp_store=MEMORY;"
+            "PRAGMA cell_size_check=ON;"
+            "PRAGMA trusted_schema=OFF");
     if (mode_ == Mode::QueryOnly) {
-        handle_->exec("PRAGMA query_only=ON");
+        execute("PRAGMA query_only=ON");
     }
 }
 
@@ -162,19 +164,15 @@ Query Database::query(std::string_view sql) {
 }
 
 void Database::execute(std::string const &sql) {
-    try {
-        handle_->exec(sql);
-    } catch (SQLite::Exception const &cause) {
-        fail(cause);
-    }
+    check(sqlite3_exec(handle_.get(), sql.c_str(), nullptr, nullptr, nullptr));
 }
 
 int64_t Database::lastInsertId() const {
-    return handle_->getLastInsertRowid();
+    return sqlite3_last_insert_rowid(handle_.get());
 }
 
 int64_t Database::changes() const {
-    return handle_->getChanges();
+    return sqlite3_changes(handle_.get());
 }
 
 int64_t Database::dataVersion() {
@@ -185,12 +183,12 @@ int64_t Database::dataVersion() {
 
 bool Database::hasMoved() const {
     int moved = 0;
-    sqlite3_file_control(handle_->getHandle(), "main", SQLITE_FCNTL_HAS_MOVED, &moved);
+    sqlite3_file_control(handle_.get(), "main", SQLITE_FCNTL_HAS_MOVED, &moved);
     return moved != 0;
 }
 
 bool Database::isReadOnly() const {
-    return mode_ == Mode::QueryOnly || sqlite3_db_readonly(handle_->getHandle(), "main") == 1;
+    return mode_ == Mode::QueryOnly || sqlite3_db_readonly(handle_.get(), "main") == 1;
 }
 
 void Database::checkIntegrity() {
@@ -200,41 +198,47 @@ void Database::checkIntegrity() {
     }
 }
 
-Database::Statement Database::take(std::string_view sql) {
+Statement Database::take(std::string_view sql) {
     if (auto const found = idle_.find(sql); found != idle_.end() && !found->second.empty()) {
         Statement statement = std::move(found->second.back());
         found->second.pop_back();
         return statement;
     }
-    try {
-        return std::make_unique<SQLite::Statement>(*handle_, std::string(sql));
-    } catch (SQLite::Exception const &cause) {
-        fail(cause);
-    }
+    sqlite3_stmt *prepared = nullptr;
+    check(sqlite3_prepare_v2(handle_.get(), sql.data(), static_cast<int>(sql.size()), &prepared, nullptr));
+    return Statement(prepared);
 }
 
 void Database::giveBack(Statement statement) noexcept {
+    sqlite3_reset(statement.get());
+    sqlite3_clear_bindings(statement.get());
     try {
-        statement->tryReset();
-        statement->clearBindings();
-        idle_[statement->getQuery()].push_back(std::move(statement));
-    } catch (std::exception const &) {
+        idle_[sqlite3_sql(statement.get())].push_back(std::move(statement));
+    } catch (std::bad_alloc const &) {
         // Not kept, then: it is prepared again next time.
     }
 }
 
-void Database::fail(SQLite::Exception const &cause) const {
-    int const systemError = sqlite3_system_errno(handle_->getHandle());
+void Database::check(int code) const {
+    if (code != SQLITE_OK) {
+        fail();
+    }
+}
+
+void Database::fail() const {
+    int const code = sqlite3_extended_errcode(handle_.get());
+    int const systemError = sqlite3_system_errno(handle_.get());
+    char const *const text = sqlite3_errmsg(handle_.get());
     std::string const name = named(identity_.kindName, path_);
-    if (cause.getErrorCode() == SQLITE_CANTOPEN && whyNotOpen(path_) == 0) {
+    if (code == SQLITE_CANTOPEN && whyNotOpen(path_) == 0) {
         // The file is open; it is its journal that cannot be. SQLite has tried to read one then, so that its error says
         // that there is none.
         if (!mayMakeFileBeside(path_)) {
-            throw explain(SQLITE_READONLY, systemError, cause.what(), name, busyTimeout_);
+            throw explain(SQLITE_READONLY, systemError, text, name, busyTimeout_);
         }
         throw Error(ErrorKind::Io, name + " cannot be written: its journal cannot be made");
     }
-    throw explain(cause.getExtendedErrorCode(), systemError, cause.what(), name, busyTimeout_);
+    throw explain(code, systemError, text, name, busyTimeout_);
 }
 
 } // namespace Sqlite

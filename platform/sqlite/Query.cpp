@@ -3,11 +3,16 @@
 
 #include <string>
 
-#include <SQLiteCpp/SQLiteCpp.h>
+#include <sqlite3.h>
 
+#include "Explain.h"
 #include "sqlite/Database.h"
 
 namespace Sqlite {
+
+void Finalize::operator()(sqlite3_stmt *statement) const noexcept {
+    sqlite3_finalize(statement);
+}
 
 Query::Query(Database &database, std::string_view sql)
     : database_(&database)
@@ -22,38 +27,29 @@ Query::~Query() {
 Query::Query(Query &&other) noexcept = default;
 
 Query &Query::bind(int parameter, int64_t value) {
-    try {
-        statement_->bind(parameter, value);
-    } catch (SQLite::Exception const &cause) {
-        database_->fail(cause);
-    }
+    database_->check(sqlite3_bind_int64(statement_.get(), parameter, value));
     return *this;
 }
 
 Query &Query::bind(int parameter, std::string_view value) {
-    try {
-        statement_->bind(parameter, std::string(value));
-    } catch (SQLite::Exception const &cause) {
-        database_->fail(cause);
-    }
+    // A null pointer would bind NULL.
+    char const *const text = value.empty() ? "" : value.data();
+    database_->check(
+        sqlite3_bind_text64(statement_.get(), parameter, text, value.size(), SQLITE_TRANSIENT, SQLITE_UTF8));
     return *this;
 }
 
 Query &Query::bindNull(int parameter) {
-    try {
-        statement_->bind(parameter);
-    } catch (SQLite::Exception const &cause) {
-        database_->fail(cause);
-    }
+    database_->check(sqlite3_bind_null(statement_.get(), parameter));
     return *this;
 }
 
 bool Query::step() {
-    try {
-        return statement_->executeStep();
-    } catch (SQLite::Exception const &cause) {
-        database_->fail(cause);
+    int const code = sqlite3_step(statement_.get());
+    if (code != SQLITE_ROW && code != SQLITE_DONE) {
+        database_->fail();
     }
+    return code == SQLITE_ROW;
 }
 
 void Query::run() {
@@ -63,20 +59,20 @@ void Query::run() {
 }
 
 void Query::reset() {
-    statement_->tryReset();
+    sqlite3_reset(statement_.get()); // tells again what step() has told
 }
 
-template <typename Read>
-auto Query::column(int index, Read const &read) const {
-    try {
-        return read(statement_->getColumn(index));
-    } catch (SQLite::Exception const &cause) {
-        database_->fail(cause);
+int Query::inRow(int column) const {
+    if (column < 0 || column >= sqlite3_data_count(statement_.get())) {
+        throw Error(ErrorKind::Other, named(database_->identity_.kindName, database_->path_) +
+                                          " cannot be used: a query has no row with a column " +
+                                          std::to_string(column));
     }
+    return column;
 }
 
 int64_t Query::integer(int column) const {
-    return this->column(column, [](SQLite::Column const &value) { return value.getInt64(); });
+    return sqlite3_column_int64(statement_.get(), inRow(column));
 }
 
 std::string Query::text(int column) const {
@@ -84,14 +80,14 @@ std::string Query::text(int column) const {
 }
 
 std::string_view Query::textView(int column) const {
-    return this->column(column, [](SQLite::Column const &value) {
-        char const *const text = value.getText();
-        return std::string_view(text, static_cast<std::size_t>(value.getBytes()));
-    });
+    auto const *const text = reinterpret_cast<char const *>(sqlite3_column_text(statement_.get(), inRow(column)));
+    return text == nullptr
+               ? std::string_view()
+               : std::string_view(text, static_cast<std::size_t>(sqlite3_column_bytes(statement_.get(), column)));
 }
 
 bool Query::isNull(int column) const {
-    return this->column(column, [](SQLite::Column const &value) { return value.isNull(); });
+    return sqlite3_column_type(statement_.get(), inRow(column)) == SQLITE_NULL;
 }
 
 } // namespace Sqlite

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "sqlite/Transaction.h"
 
-#include <SQLiteCpp/SQLiteCpp.h>
 #include <sqlite3.h>
 
 #include "sqlite/Database.h"
@@ -19,7 +18,7 @@ Transaction::Transaction(Database &database, Kind kind)
 
 Transaction::~Transaction() {
     // SQLite rolls back by itself after some errors; there is nothing to do then.
-    if (database_ == nullptr || sqlite3_get_autocommit(database_->handle_->getHandle()) != 0) {
+    if (database_ == nullptr || sqlite3_get_autocommit(database_->handle_.get()) != 0) {
         return;
     }
     try {

@@ -23,11 +23,8 @@
 #include "sqlite/Error.h"
 #include "sqlite/Query.h"
 
-namespace SQLite {
-class Database;
-class Exception;
-class Statement;
-} // namespace SQLite
+struct sqlite3;
+struct sqlite3_stmt;
 
 namespace Sqlite {
 
@@ -90,7 +87,9 @@ public:
 private:
     friend class Query;
     friend class Transaction;
-    using Statement = std::unique_ptr<SQLite::Statement>;
+    struct Close {
+        void operator()(sqlite3 *handle) const noexcept;
+    };
     struct TextHash {
         using is_transparent = void;
         std::size_t operator()(std::string_view text) const noexcept {
@@ -104,14 +103,17 @@ private:
     void createLayout();
     Statement take(std::string_view sql);
     void giveBack(Statement statement) noexcept;
-    [[noreturn]] void fail(SQLite::Exception const &cause) const;
+    /// Throws what went wrong last on the handle, unless the code says that nothing did.
+    void check(int code) const;
+    [[noreturn]] void fail() const;
 
     std::string path_;
     Identity identity_;
     Mode mode_;
     std::chrono::milliseconds busyTimeout_;
-    std::unique_ptr<SQLite::Database> handle_;
-    /// Statements that no query uses now; several of one text when queries of it were nested.
+    std::unique_ptr<sqlite3, Close> handle_;
+    /// Statements that no query uses now; several of one text when queries of it were nested. They go before the
+    /// handle.
     std::unordered_map<std::string, std::vector<Statement>, TextHash, std::equal_to<>> idle_;
 };
 

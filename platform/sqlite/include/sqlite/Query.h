@@ -6,13 +6,16 @@
 #include <string>
 #include <string_view>
 
-namespace SQLite {
-class Statement;
-}
+struct sqlite3_stmt;
 
 namespace Sqlite {
 
 class Database;
+
+struct Finalize {
+    void operator()(sqlite3_stmt *statement) const noexcept;
+};
+using Statement = std::unique_ptr<sqlite3_stmt, Finalize>;
 
 /// One use of a prepared statement. Parameters count from 1, columns from 0. Everything throws Sqlite::Error.
 class Query {
@@ -43,11 +46,10 @@ public:
     bool isNull(int column) const;
 
 private:
-    template <typename Read>
-    auto column(int index, Read const &read) const;
+    int inRow(int column) const;
 
     Database *database_;
-    std::unique_ptr<SQLite::Statement> statement_;
+    Statement statement_;
 };
 
 } // namespace Sqlite
