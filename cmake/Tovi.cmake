@@ -27,8 +27,9 @@ if(TOVI_SANITIZE)
   add_compile_options(-fsanitize=${TOVI_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
   add_link_options(-fsanitize=${TOVI_SANITIZE})
 else()
-  # Reports what a library still lacks when it is linked, not when it is loaded.
-  add_link_options($<$<STREQUAL:$<TARGET_PROPERTY:TYPE>,SHARED_LIBRARY>:-Wl,-z,defs>)
+  # Reports what a library still lacks when it is linked, not when it is loaded. What a library has itself (functions,
+  # virtual tables, type information) needs no name looked up when it is loaded: nobody substitutes parts of one.
+  add_link_options("$<$<STREQUAL:$<TARGET_PROPERTY:TYPE>,SHARED_LIBRARY>:-Wl,-z,defs,-Bsymbolic>")
 endif()
 
 if(TOVI_COVERAGE)

@@ -2,6 +2,7 @@
 #include "PlatformLibraries.h"
 
 #include <dlfcn.h>
+#include <link.h>
 #include <string_view>
 #include <utility>
 
@@ -21,6 +22,27 @@ extern "C" void passOn(void *context, LumoRequestTrace const *request) {
     auto const &receiver = *static_cast<std::function<void(RequestDone const &)> *>(context);
     receiver({request->method, request->requestId, request->socketPath, request->sentBytes, request->receivedBytes,
               request->replies, request->code, std::chrono::microseconds(request->microseconds)});
+}
+
+/// Where a library of that name was loaded from; empty when there is none. To ask dlopen by name would have it search
+/// directories for one that is not there.
+std::string pathInProcess(std::string const &name) {
+    struct Search {
+        std::string_view name;
+        std::string found;
+    } search{name, {}};
+    dl_iterate_phdr(
+        [](dl_phdr_info *info, std::size_t, void *context) {
+            auto &wanted = *static_cast<Search *>(context);
+            std::string_view const path = info->dlpi_name;
+            bool const isIt = path.substr(path.rfind('/') + 1) == wanted.name;
+            if (isIt) {
+                wanted.found = path;
+            }
+            return isIt ? 1 : 0;
+        },
+        &search);
+    return search.found;
 }
 
 } // namespace
@@ -58,10 +80,9 @@ std::string PlatformLibraries::load(std::string const &name) {
     if (loaded_.contains(name)) {
         return {};
     }
-    void *library = dlopen(name.c_str(), RTLD_LAZY | RTLD_NOLOAD);
-    if (library == nullptr) {
-        library = dlopen((directory_ + "/" + name).c_str(), RTLD_LAZY | RTLD_LOCAL);
-    }
+    std::string const present = pathInProcess(name);
+    std::string const path = present.empty() ? directory_ + "/" + name : present;
+    void *const library = dlopen(path.c_str(), RTLD_LAZY | RTLD_LOCAL);
     if (library == nullptr) {
         char const *const text = dlerror();
         return "it needs " + name + ", which cannot be loaded: " + (text != nullptr ? text : "unknown error");

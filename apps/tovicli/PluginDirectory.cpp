@@ -10,6 +10,7 @@
 #include <fcntl.h>
 #include <memory>
 #include <sys/stat.h>
+#include <utility>
 
 namespace Tovicli {
 
@@ -32,35 +33,31 @@ std::string ownershipProblem(struct stat const &status, uid_t user, bool stickyW
     return {};
 }
 
-/// Opens a directory from the root down, each component on the descriptor of the one above it, so that what was checked
-/// cannot be exchanged on the way.
+/// Opens a directory that no link leads to, if nobody else can exchange it. The directories above it are looked at from
+/// the root down: who could put something else into one of them was found trustworthy before what it holds is looked
+/// at.
 Descriptor openChecked(std::string const &canonical, uid_t user, std::string &problem) {
-    Descriptor directory(open("/", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    std::size_t begin = 1;
-    std::string shown = "/";
-    while (directory.isOpen()) {
-        struct stat status {};
-        bool const isLast = begin >= canonical.size();
-        if (fstat(directory.number(), &status) != 0) {
-            problem = systemText(errno);
+    struct stat status {};
+    for (std::size_t end = 1; end < canonical.size(); end = std::min(canonical.find('/', end + 1), canonical.size())) {
+        std::string const above = canonical.substr(0, end);
+        if (lstat(above.c_str(), &status) != 0) {
+            problem = "'" + above + "': " + systemText(errno);
+        } else if (!S_ISDIR(status.st_mode)) {
+            problem = "'" + above + "': " + systemText(ENOTDIR);
+        } else if (std::string const found = ownershipProblem(status, user, true); !found.empty()) {
+            problem = "'" + above + "' " + found;
+        }
+        if (!problem.empty()) {
             return Descriptor();
         }
-        if (std::string const found = ownershipProblem(status, user, !isLast); !found.empty()) {
-            problem = "'" + shown + "' " + found;
-            return Descriptor();
-        }
-        if (isLast) {
-            return directory;
-        }
-        std::size_t const end = std::min(canonical.find('/', begin), canonical.size());
-        std::string const component = canonical.substr(begin, end - begin);
-        shown = canonical.substr(0, end);
-        begin = end + 1;
-        directory =
-            Descriptor(openat(directory.number(), component.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
     }
-    problem = "'" + shown + "': " + systemText(errno);
-    return Descriptor();
+    Descriptor directory(open(canonical.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    if (!directory.isOpen() || fstat(directory.number(), &status) != 0) {
+        problem = "'" + canonical + "': " + systemText(errno);
+    } else if (std::string const found = ownershipProblem(status, user, false); !found.empty()) {
+        problem = "'" + canonical + "' " + found;
+    }
+    return problem.empty() ? std::move(directory) : Descriptor();
 }
 
 std::vector<std::string> libraryNames(Descriptor const &directory, std::string &problem) {

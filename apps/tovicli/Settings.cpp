@@ -4,10 +4,9 @@
 #include <algorithm>
 #include <charconv>
 
-#include <boost/algorithm/string/case_conv.hpp>
-
 #include "plexa/FormatSettings.h"
 #include "plexa/Formatter.h"
+#include "plexa/Text.h"
 #include "plexa/UsageError.h"
 
 namespace Tovicli {
@@ -76,10 +75,9 @@ std::optional<std::string> logLevel(CallSpec::Input const &options, Environment 
     if (!source) {
         return std::nullopt;
     }
-    std::string const level = boost::algorithm::to_lower_copy(source->value, std::locale::classic());
     for (char const *known : {"quiet", "panic", "error", "warning", "info", "verbose", "trivia"}) {
-        if (level == known) {
-            return level;
+        if (Plexa::equalIgnoringCase(source->value, known)) {
+            return known;
         }
     }
     throw UsageError(source->origin + ": " + shownWord(source->value) +

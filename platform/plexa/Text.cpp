@@ -81,6 +81,12 @@ private:
 
 } // namespace
 
+bool equalIgnoringCase(std::string_view left, std::string_view right) {
+    auto const lower = [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + ('a' - 'A')) : c; };
+    return std::equal(left.begin(), left.end(), right.begin(), right.end(),
+                      [&](char a, char b) { return lower(a) == lower(b); });
+}
+
 bool isValidUtf8(std::string_view text) {
     while (!text.empty()) {
         if (!takeCharacter(text).valid) {

@@ -5,8 +5,7 @@
 #include <charconv>
 #include <utility>
 
-#include <boost/algorithm/string/predicate.hpp>
-
+#include "plexa/Text.h"
 #include "plexa/UsageError.h"
 
 namespace Plexa {
@@ -31,10 +30,10 @@ int64_t toNumber(std::string const &option, std::string const &value) {
 }
 
 bool toTruth(std::string const &option, std::string const &value) {
-    if (boost::algorithm::iequals(value, "true", std::locale::classic())) {
+    if (equalIgnoringCase(value, "true")) {
         return true;
     }
-    if (boost::algorithm::iequals(value, "false", std::locale::classic())) {
+    if (equalIgnoringCase(value, "false")) {
         return false;
     }
     throw UsageError(option + ": " + shownWord(value) + " is not a boolean, true or false is expected");

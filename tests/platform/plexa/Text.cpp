@@ -71,4 +71,12 @@ TEST(Text, OptionTableAlignsAndWrapsDescriptions) {
                      "          Below its name.\n");
 }
 
+TEST(Text, KeywordsAreEqualWithoutRegardToTheCaseOfAsciiLetters) {
+    EXPECT_TRUE(equalIgnoringCase("Trivia", "tRIVIA"));
+    EXPECT_TRUE(equalIgnoringCase("", ""));
+    EXPECT_FALSE(equalIgnoringCase("true", "truer"));
+    EXPECT_FALSE(equalIgnoringCase("[", "{"));               // one bit apart, as letters are
+    EXPECT_FALSE(equalIgnoringCase("\xC3\x84", "\xC3\xA4")); // no letters of ASCII
+}
+
 } // namespace

@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "DaemonCommand.h"
 
+#include <algorithm>
+#include <cctype>
 #include <optional>
+#include <string_view>
 #include <vector>
 
-#include <boost/algorithm/string/predicate.hpp>
 #include <boost/make_shared.hpp>
 
 #include "DaemonSession.h"
@@ -54,6 +56,17 @@ OutputSpecPtr DaemonCommand::GetOutputSpecInternal() {
     return declareResult(MetaObj::MetaBool::New());
 }
 
+namespace {
+
+/// Without regard to case. Boost's way of asking sets up a locale, which takes as long as the whole request.
+bool isSameWord(std::string_view left, std::string_view right) {
+    auto const lower = [](char c) { return std::tolower(static_cast<unsigned char>(c)); };
+    return std::equal(left.begin(), left.end(), right.begin(), right.end(),
+                      [&](char a, char b) { return lower(a) == lower(b); });
+}
+
+} // namespace
+
 unsigned DaemonCommand::GetLogLevelInt(std::string keyword) {
     struct Level {
         char const *keyword;
@@ -63,7 +76,7 @@ unsigned DaemonCommand::GetLogLevelInt(std::string keyword) {
     static constexpr Level levels[] = {{"panic", 2}, {"quiet", 1},    {"error", 4},  {"warning", 8},
                                        {"info", 16}, {"verbose", 32}, {"trivia", 64}};
     for (Level const &level : levels) {
-        if (boost::algorithm::iequals(keyword, level.keyword)) {
+        if (isSameWord(keyword, level.keyword)) {
             return level.number;
         }
     }
