@@ -3,10 +3,12 @@
 // How long a request over the priority socket takes while the ordered queue is stuck: its first change waits for a
 // provider that does not answer, and a hundred more wait behind it.
 //
-//   bench_priority CONTAINER UUID REQUESTS      on the daemon of TOVI_ROOT, whose provider hangs in createVirtualVolume
+//   bench_priority CONTAINER UUID ROUNDS REQUESTS   on the daemon of TOVI_ROOT, whose provider hangs in
+//   createVirtualVolume
 //
-// A line each for a ping, for the question for all containers, and for a change (binding a volume that is bound):
-// the name, nanoseconds that half and 99 of 100 requests took at most, and those of the longest.
+// A line a round for a ping, for the question for all containers, and for a change (binding a volume that is bound):
+// "free" before the queue is stuck or "stuck", the name, nanoseconds that half and 99 of 100 requests took at most, and
+// those of the longest.
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
@@ -25,7 +27,13 @@ constexpr size_t waitingChanges = 100;
 
 using Bench::RawSession;
 
-void print(char const *name, RawSession &session, RawSession::Fill const &fill, size_t requests) {
+struct Amount {
+    size_t rounds;
+    size_t requests;
+};
+
+void printRound(char const *queue, char const *name, RawSession &session, RawSession::Fill const &fill,
+                size_t requests) {
     session.prepare(fill);
     std::vector<long long> taken;
     for (size_t i = 0; i < requests; ++i) {
@@ -34,16 +42,27 @@ void print(char const *name, RawSession &session, RawSession::Fill const &fill, 
         taken.push_back((std::chrono::steady_clock::now() - start) / std::chrono::nanoseconds(1));
     }
     std::sort(taken.begin(), taken.end());
-    std::printf("%s %lld %lld %lld\n", name, taken[requests / 2], taken[requests * 99 / 100], taken.back());
+    std::printf("%s %s %lld %lld %lld\n", queue, name, taken[requests / 2], taken[requests * 99 / 100], taken.back());
 }
 
-void run(std::string const &root, std::string const &container, std::string const &uuid, size_t requests) {
+void printRounds(char const *queue, std::string const &root, RawSession::Fill const &bind, Amount amount) {
+    RawSession session(root + "/run/lumod-priority.sock");
+    for (size_t round = 0; round < amount.rounds; ++round) {
+        printRound(
+            queue, "ping", session, [](auto request) { request.setPing(); }, amount.requests);
+        printRound(
+            queue, "containers", session, [](auto request) { request.setGetStorageContainer(); }, amount.requests);
+        printRound(queue, "bind", session, bind, amount.requests);
+    }
+}
+
+void run(std::string const &root, std::string const &container, std::string const &uuid, Amount amount) {
     auto const bind = [&](Wire::Request::Builder request) {
         auto key = request.initBindVirtualVolume();
         key.setContainerId(container);
         key.setUuid(uuid);
     };
-    RawSession(root + "/run/lumod-priority.sock").prepare(bind);
+    printRounds("free", root, bind, amount);
 
     std::vector<std::unique_ptr<RawSession>> stuck;
     for (size_t i = 0; i <= waitingChanges; ++i) {
@@ -61,12 +80,7 @@ void run(std::string const &root, std::string const &container, std::string cons
         }
     }
 
-    RawSession priority(root + "/run/lumod-priority.sock");
-    print(
-        "ping", priority, [](Wire::Request::Builder request) { request.setPing(); }, requests);
-    print(
-        "containers", priority, [](Wire::Request::Builder request) { request.setGetStorageContainer(); }, requests);
-    print("bind", priority, bind, requests);
+    printRounds("stuck", root, bind, amount);
 
     if (std::any_of(stuck.begin(), stuck.end(), [](auto const &session) { return session->isAnswered(); })) {
         throw std::runtime_error("the ordered queue is not stuck: a change in it was answered");
@@ -77,13 +91,15 @@ void run(std::string const &root, std::string const &container, std::string cons
 
 int main(int argc, char **argv) {
     char const *const root = std::getenv("TOVI_ROOT");
-    size_t const requests = argc == 4 ? std::strtoul(argv[3], nullptr, 10) : 0;
-    if (root == nullptr || requests == 0) {
-        std::fputs("usage: TOVI_ROOT=DIR bench_priority CONTAINER UUID REQUESTS\n", stderr);
+    bool const isWhole = root != nullptr && argc == 5;
+    Amount const amount =
+        isWhole ? Amount{std::strtoul(argv[3], nullptr, 10), std::strtoul(argv[4], nullptr, 10)} : Amount{};
+    if (amount.rounds == 0 || amount.requests == 0) {
+        std::fputs("usage: TOVI_ROOT=DIR bench_priority CONTAINER UUID ROUNDS REQUESTS\n", stderr);
         return 2;
     }
     try {
-        run(root, argv[1], argv[2], requests);
+        run(root, argv[1], argv[2], amount);
     } catch (std::exception const &error) {
         std::fprintf(stderr, "bench_priority: %s\n", error.what());
         return 1;

@@ -54,10 +54,16 @@ def priority(suite):
         loaded = host.lumo_json("storagecontainer", "load")[0]
         path = os.path.join(host.root, "volumes", loaded["StorageContainer Name"])
         volume = host.lumo_json("storagecontainer", "checklumos", "-p", path)[0]["LumoId"]
-        text = subprocess.run([suite.build.program("bench_priority"), loaded["StorageContainer Id"], volume, "2000"],
+        rounds = str(suite.options.rounds or 7)
+        text = subprocess.run([suite.build.program("bench_priority"), loaded["StorageContainer Id"], volume, rounds, "1000"],
                               env=host.env, check=True, text=True, stdout=subprocess.PIPE).stdout
+    taken = {}
     for line in text.splitlines():
-        name, *taken = line.split()
-        half, most, longest = (int(nanoseconds) / 1e6 for nanoseconds in taken)
-        suite.report.line(f"priority {name}, ordered queue stuck", most, half, longest, 10, 10,
-                          f"99 of 100 requests; half within {written(half, 'ms')}, the longest {written(longest, 'ms')}", "ms")
+        queue, name, *figures = line.split()
+        taken.setdefault((queue, name), []).append([int(nanoseconds) / 1e6 for nanoseconds in figures])
+    for name in ("ping", "containers", "bind"):
+        half, most, longest = zip(*taken["stuck", name])
+        free_half, free_most, _ = zip(*taken["free", name])
+        suite.report.amounts(f"priority {name}, ordered queue stuck", most, "ms", 10, 10,
+                             f"99 of 100 requests; half within {written(median(half))}, the longest {written(max(longest))}; before the "
+                             f"queue was stuck 99 of 100 within {written(median(free_most))}, half within {written(median(free_half))}")
