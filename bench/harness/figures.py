@@ -63,6 +63,7 @@ class Report:
 
     def growth(self, name, times, limit):
         """Times by size, in the sizes' order: how much longer each size took than the one before it."""
+        times = list(times)
         for (small, small_times), (large, large_times) in zip(times, times[1:]):
             base = median(small_times)
             low, high = quartiles(large_times)

@@ -1,5 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
 """Providers over HTTPS: against the embedded provider, under load, and when one hangs."""
+import contextlib
 import os
 import sqlite3
 import subprocess
@@ -10,27 +11,27 @@ from harness.crowds import report_rate
 
 def https(suite):
     """All storage containers when the array is behind HTTPS, against the same array as a file."""
-    times = {}
-    for size in (size for size in suite.options.sizes if size >= 10000):
-        topology = suite.topology(size)
-        with Host(suite.build, suite.options.memory_on, topology, https=True) as far, \
-                Host(suite.build, suite.options.memory_on, topology) as near:
-            for host in (far, near):
+    with contextlib.ExitStack() as stack:
+        hosts = {}
+        for size in suite.options.sizes:
+            hosts[size] = [stack.enter_context(Host(suite.build, suite.options.memory_on, suite.topology(size), https=far))
+                           for far in (True, False)]
+            for host in hosts[size]:
                 host.register()
                 _first(suite, host)
-            for name, rounds, before in (("changed", 5, _change), ("unchanged", 15, lambda _: None)):
-                pairs = []
-                for _ in range(suite.options.rounds or rounds):
-                    taken = []
-                    for host in (far, near):
-                        before(host.array)
-                        taken.append(_first(suite, host))
-                    pairs.append(tuple(taken))
+        for name, usual, before in (("changed", 8, _change), ("unchanged", 16, lambda _: None)):
+            def turn(host):
+                before(host.array)
+                return _first(suite, host)
+
+            def measure(size, rounds):
+                return [tuple(turn(host) for host in hosts[size]) for _ in range(rounds)]
+
+            times = suite.in_turns(lambda _: usual, measure)
+            for size, pairs in times.items():
                 suite.report.pairs(f"https {size} containers, {name}", pairs, 4.0, 4.0)
-                times.setdefault(name, []).append((size, [ours for ours, _ in pairs]))
-                suite.report.point("containers", f"HTTPS, {name}", size, times[name][-1][1])
-    for name, grown in times.items():
-        suite.report.growth(f"https, {name}: growth", grown, 10.5)
+                suite.report.point("containers", f"HTTPS, {name}", size, [ours for ours, _ in pairs])
+            suite.report.growth(f"https, {name}: growth", [(size, [ours for ours, _ in pairs]) for size, pairs in times.items()], 10.5)
 
 
 def _first(suite, host):

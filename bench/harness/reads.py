@@ -1,5 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
 """Long answers: through the client library, through commands, through formats."""
+import contextlib
 import os
 import subprocess
 
@@ -8,21 +9,31 @@ from harness.box import SUBTREE, Host, rounds_of
 
 def query(suite):
     """All storage containers through the client library against the same replies as raw bytes."""
-    times = []
-    for size in suite.options.sizes:
-        rounds = suite.options.rounds or max(10, 100000 // size)
-        with Host(suite.build, suite.options.memory_on, suite.topology(size)) as host:
+    program = suite.build.program("bench_query")
+    with contextlib.ExitStack() as stack:
+        hosts = {size: stack.enter_context(Host(suite.build, suite.options.memory_on, suite.topology(size)))
+                 for size in suite.options.sizes}
+        for host in hosts.values():
             host.register()
-            pairs = rounds_of([suite.build.program("bench_query"), "time", str(rounds)], host.env)
-            suite.report.pairs(f"query {size} containers", pairs, 1.5, 2.0)
-            ours, floor = zip(*pairs)
-            suite.report.point("containers", "query", size, ours)
-            suite.report.point("containers", "query: raw bytes", size, floor)
-            times.append((size, ours))
-            records, taken, peak = rounds_of([suite.build.program("bench_query"), "memory"], host.env)[0]
-            suite.report.line(f"query {size} containers: memory", taken / records, taken / records, taken / records, 1.3, 1.5,
-                              f"{taken:,} bytes for {records:,} of records, grew by {peak:,} at the peak")
-    suite.report.growth("query growth", times, 10.5)
+        pairs = suite.in_turns(lambda size: max(12, 100000 // size),
+                               lambda size, rounds: rounds_of([program, "time", str(rounds)], hosts[size].env))
+        memory = {size: rounds_of([program, "memory"], host.env)[0] for size, host in hosts.items()}
+    for size, taken in pairs.items():
+        suite.report.pairs(f"query {size} containers", taken, 1.5, 2.0)
+        _points(suite, "containers", size, taken, "query", "query: raw bytes")
+    for size, (records, taken, peak) in memory.items():
+        suite.report.line(f"query {size} containers: memory", taken / records, taken / records, taken / records, 1.3, 1.5,
+                          f"{taken:,} bytes for {records:,} of records, grew by {peak:,} at the peak")
+    _growth(suite, "query growth", pairs)
+
+
+def _points(suite, plot, size, pairs, ours, floor):
+    for line, column in zip((ours, floor), zip(*pairs)):
+        suite.report.point(plot, line, size, column)
+
+
+def _growth(suite, name, pairs):
+    suite.report.growth(name, [(size, [ours for ours, _ in taken]) for size, taken in pairs.items()], 10.5)
 
 
 def read(suite):
@@ -34,20 +45,26 @@ def read(suite):
     ):
         if not suite.wanted(name):
             continue
-        times = []
-        for size in suite.options.sizes:
-            shape = {"volumes": size} if plot == "volumes" else {"volumes": 1, "metadata": size}
-            with Host(suite.build, suite.options.memory_on, suite.topology(1, **shape)) as host:
-                pairs = _read_pairs(suite, host, size, words, record)
-            suite.report.pairs(f"{name}, {size}", pairs, 2.0, 2.0)
-            ours, floor = zip(*pairs)
-            suite.report.point(plot, name.removeprefix("read "), size, ours)
-            suite.report.point(plot, "raw bytes", size, floor)
-            times.append((size, ours))
-        suite.report.growth(f"{name}: growth", times, 10.5)
+        with contextlib.ExitStack() as stack:
+            commands = {}
+            for size in suite.options.sizes:
+                shape = {"volumes": size} if plot == "volumes" else {"volumes": 1, "metadata": size}
+                host = stack.enter_context(Host(suite.build, suite.options.memory_on, suite.topology(1, **shape)))
+                commands[size] = _commands(suite, host, words, record)
+
+            def measure(size, rounds):
+                ours, floor, env = commands[size]
+                return rounds_of([suite.build.program("bench_pair"), str(rounds), *ours, "--", *floor], env)
+
+            pairs = suite.in_turns(lambda size: max(8, 20000 // size), measure)
+        for size, taken in pairs.items():
+            suite.report.pairs(f"{name}, {size}", taken, 2.0, 2.0)
+            _points(suite, plot, size, taken, name.removeprefix("read "), "raw bytes")
+        _growth(suite, f"{name}: growth", pairs)
 
 
-def _read_pairs(suite, host, size, words, record):
+def _commands(suite, host, words, record):
+    """@return the command, its floor, and their environment"""
     host.register()
     loaded = host.lumo_json("storagecontainer", "load")[0]
     facts = {"container": loaded["StorageContainer Id"], "path": os.path.join(host.root, "volumes", loaded["StorageContainer Name"])}
@@ -55,10 +72,7 @@ def _read_pairs(suite, host, size, words, record):
     requests = os.path.join(host.root, "requests")
     replay = suite.build.program("bench_replay")
     subprocess.run([replay, "record", requests, *(word.format(**facts) for word in record)], env=host.env, check=True)
-    rounds = suite.options.rounds or max(7, 20000 // size)
-    command = [suite.build.program("bench_pair"), str(rounds), "tovicli", *SUBTREE, *(word.format(**facts) for word in words), "--",
-               replay, requests]
-    return rounds_of(command, host.env)
+    return ["tovicli", *SUBTREE, *(word.format(**facts) for word in words)], [replay, requests], host.env
 
 
 def format(suite):

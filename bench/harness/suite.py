@@ -1,5 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
 """All benchmarks in their order, and what they share."""
+import math
 import pathlib
 import subprocess
 import tempfile
@@ -26,6 +27,9 @@ BENCHMARKS = (
 )
 
 
+TURNS = 4
+
+
 class Suite:
     def __init__(self, build, options):
         self.build, self.options, self.report, self.scratch = build, options, Report(), None
@@ -42,6 +46,19 @@ class Suite:
                                 str(containers), "--volumes", str(volumes), "--metadata", str(metadata)],
                                check=True, stdout=file)
         return str(path)
+
+    def in_turns(self, usual, measure):
+        """Measures every size a few rounds at a time, in turns: growth compares sizes, and a machine's pace drifts.
+
+        @param usual rounds by size; measure a function of size and number of rounds that returns them as a list
+        @return rounds by size
+        """
+        rounds = {size: self.options.rounds or usual(size) for size in self.options.sizes}
+        taken = {size: [] for size in rounds}
+        while left := [size for size in rounds if len(taken[size]) < rounds[size]]:
+            for size in left:
+                taken[size] += measure(size, min(math.ceil(rounds[size] / TURNS), rounds[size] - len(taken[size])))
+        return taken
 
     def run(self):
         with tempfile.TemporaryDirectory(prefix="tovi-bench-scratch.") as self.scratch:

@@ -5,12 +5,13 @@ import pathlib
 import subprocess
 import sys
 import tempfile
+import types
 import unittest
 
 TOP = pathlib.Path(__file__).resolve().parent.parent.parent
 sys.path.insert(0, str(TOP / "bench"))
 
-from harness import document, plot, profile  # noqa: E402
+from harness import document, plot, profile, suite  # noqa: E402
 from harness.figures import Report, quartiles, verdict, written  # noqa: E402
 
 MACHINE = {"processor": "P", "cores": 2, "kernel": "6.1", "memory": "4.0 GiB"}
@@ -75,6 +76,20 @@ class Arithmetic(unittest.TestCase):
         printed = []
         report(("name", 1.5), out=printed.append)
         self.assertEqual(printed, ["name" + " " * 40 + "       1.50  (1.50 to 1.50)  goal 2.0   limit 3.0   within the goal  "])
+
+
+class Turns(unittest.TestCase):
+    def test_sizes_are_measured_in_turns(self):
+        options = types.SimpleNamespace(rounds=None, sizes=[10, 100])
+        asked = []
+
+        def measure(size, rounds):
+            asked.append((size, rounds))
+            return [size] * rounds
+
+        taken = suite.Suite(None, options).in_turns(lambda size: 10 if size == 10 else 2, measure)
+        self.assertEqual(taken, {10: [10] * 10, 100: [100] * 2})
+        self.assertEqual(asked, [(10, 3), (100, 1), (10, 3), (100, 1), (10, 3), (10, 1)])
 
 
 class KeptFigures(unittest.TestCase):
@@ -153,7 +168,7 @@ class Plot(unittest.TestCase):
     def test_points_are_drawn_in_the_order_of_sizes(self):
         text = plot.script({"volumes": {"ours": [[100, 2.5], [10, 1.0]]}}, "x.svg")
         self.assertIn("$points0 << end\n10 1.0\n100 2.5\nend\n", text)
-        self.assertIn("plot $points0 using 1:2 with linespoints lw 2 pt 7 ps 0.6 title 'ours'", text)
+        self.assertIn("plot $points0 using 1:2 with linespoints lw 2 dt 1 pt 7 ps 0.6 title 'ours'", text)
         self.assertEqual(text.count("set multiplot next"), 2)
 
 
