@@ -8,6 +8,7 @@ come from TOVI_BUILD_DIR, which ctest sets.
 import json
 import os
 import pathlib
+import select
 import shutil
 import signal
 import sqlite3
@@ -31,6 +32,16 @@ def build():
     return pathlib.Path(given).resolve()
 
 
+def kill(pid):
+    """Kills a process and waits until it is gone."""
+    descriptor = os.pidfd_open(pid)
+    try:
+        signal.pidfd_send_signal(descriptor, signal.SIGKILL)
+        select.select([descriptor], [], [])
+    finally:
+        os.close(descriptor)
+
+
 class Ended:
     """How a run of the tool ended."""
 
@@ -51,6 +62,7 @@ class Host:
         self.environment.update(TOVI_ROOT=str(self.root), TOVI_TIMEOUT_MS="20000")
         self.url = None
         self.kills = 0
+        self.disturbances = 0  # beginnings and ends of times in which commands may fail
         self.is_up = threading.Event()
 
     def up(self):
@@ -58,17 +70,25 @@ class Host:
                               capture_output=True, text=True)
         assert told.returncode == 0, told.stderr
         self.url = next(line for line in told.stdout.splitlines() if "LUMO_ARRAY_URL" in line).split("=", 1)[1]
-        self.is_up.set()
+        self.settle()
 
     def down(self):
         if (self.root / "run").exists():
             subprocess.run([TOP / "lab/down", "--root", self.root], check=True, capture_output=True)
 
+    def disturb(self):
+        self.disturbances += 1
+        self.is_up.clear()
+
+    def settle(self):
+        self.disturbances += 1
+        self.is_up.set()
+
     def kill_and_return(self):
         """The daemon dies without a word, and is back after a while."""
         self.kills += 1
-        self.is_up.clear()
-        os.kill(int((self.root / "run/lumod.pid").read_text()), signal.SIGKILL)
+        self.disturb()
+        kill(int((self.root / "run/lumod.pid").read_text()))
         self.up()
 
     def tool(self, *words):
@@ -141,6 +161,7 @@ class Fleet:
         self.hosts = [Host(name, self.directory, ["--https"] if name == NAMES[0] else ["--beside", first])
                       for name in NAMES]
         self.array = first / "arrays/small.array"
+        self.server = None  # of the array, once it is not the one that lab/up started
 
     def __enter__(self):
         try:
@@ -154,12 +175,38 @@ class Fleet:
     def __exit__(self, *_):
         for host in reversed(self.hosts):
             host.down()
+        self.end_server()
         shutil.rmtree(self.directory, ignore_errors=True)
 
-    def join(self):
-        """Every host knows the array and has its containers."""
+    def end_server(self):
+        if self.server is not None:
+            self.server.wait(timeout=20)
+            self.server.stdout.close()
+            self.server = None
+
+    def kill_server_and_return(self):
+        """The array's server dies under all hosts, and another one takes its place."""
+        run = self.hosts[0].root / "run"
+        record = run / "lab.orkasim"
         for host in self.hosts:
-            host.done("orkaprovider", "add", "--vp-name", "lab", "--vp-url", host.url)
+            host.disturb()
+        kill(int(record.read_text().split()[0]))
+        self.end_server()
+        place = (run / "orkasim.url").read_text().split("/")[2]
+        words = ["serve", "--listen", place, "--cert", run / "orkasim.pem", "--key", run / "orkasim.key", self.array]
+        self.server = subprocess.Popen([build() / "bin/orkasim", *words], stdin=subprocess.DEVNULL,
+                                       stdout=subprocess.PIPE, text=True)
+        assert place in self.server.stdout.readline(), "orkasim did not come back"
+        # As lab/up records it: id and start time, behind the name in parentheses.
+        started = pathlib.Path(f"/proc/{self.server.pid}/stat").read_text().rpartition(") ")[2].split()[19]
+        record.write_text(f"{self.server.pid} {started}\n")
+        for host in self.hosts:
+            host.settle()
+
+    def join(self, url=None):
+        """Every host knows the array, and has its containers. @param url where it is; None: at its server"""
+        for host in self.hosts:
+            host.done("orkaprovider", "add", "--vp-name", "lab", "--vp-url", url or host.url)
             host.done("storagecontainer", "load")
 
     # What the array itself holds.

@@ -6,11 +6,10 @@ what went wrong where. TOVI_LONG=1 runs it; without, it is only read."""
 import os
 import re
 import shutil
-import signal
 import subprocess
 import unittest
 
-from fleet import CONTAINERS, NAMES, TOP, Fleet, build
+from fleet import CONTAINERS, NAMES, TOP, Fleet, build, kill
 
 LONG = os.environ.get("TOVI_LONG") == "1"
 PLAYBOOK = shutil.which("ansible-playbook")
@@ -73,7 +72,7 @@ class Playbook(unittest.TestCase):
     @unittest.skipUnless(LONG, "takes long")
     def test_a_host_that_fails_fails_alone_and_in_one_line(self):
         first, dead, cut_off = self.fleet.hosts
-        os.kill(int((dead.root / "run/lumod.pid").read_text()), signal.SIGKILL)
+        kill(int((dead.root / "run/lumod.pid").read_text()))
         run = self.play()
         self.assertEqual((run.status, run.of("failed")), (2, {"a": 0, "b": 1, "c": 0}), run.out)
         self.assertEqual(len(run.failures), 1, run.out)

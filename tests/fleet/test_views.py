@@ -88,6 +88,20 @@ class Views(unittest.TestCase):
             self.assertEqual((self.gold(host) / "vm/who").read_text(), host.name)
             host.done("configlumo", "umount", *VM)
 
+    def test_a_host_that_has_let_go_may_unbind_what_another_one_has(self):
+        """Why --unbind-now comes before a move; without it a volume stays accessible, and its binding is gone."""
+        self.a.done("configlumo", "add", *VM)
+        self.a.done("configlumo", "mount", *VM)
+        self.a.done("configlumo", "umount", *VM)
+        self.b.done("configlumo", "mount", *VM)
+        self.assertIn("vm", self.fleet.bound())
+        self.a.done("daemon", "set", "--unbind-now")
+        self.assertNotIn("vm", self.fleet.bound())
+        self.assertEqual(self.b.statuses("gold")[self.uuid("vm")], "accessible")
+        self.b.done("configlumo", "umount", *VM)
+        self.b.done("configlumo", "mount", *VM)
+        self.assertIn("vm", self.fleet.bound())
+
     def test_an_outage_is_one_host_s(self):
         self.a.done("configlumo", "add", *VM)
         self.a.done("configlumo", "mount", *VM)
