@@ -27,7 +27,7 @@ quiet() {
 }
 
 @test "pages are found where the programs are" {
-    for page in tovicli tovicli-storage-internal-lumo-storagecontainer-load orkasim lumod; do
+    for page in tovicli tovicli-storage-internal-lumo-storagecontainer-load orkasim orka-conformance lumod; do
         run -0 man -w "$page"
         [[ "$output" == "$TOVI_BUILD_DIR"/share/man/* ]]
     done
