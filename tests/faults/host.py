@@ -64,6 +64,7 @@ class Host:
         if self.server is not None:
             self.server.terminate()
             self.server.wait(timeout=20)
+            self.server.stdout.close()
         shutil.rmtree(self.directory, ignore_errors=True)
 
     def run(self, *words, stdin=None, **settings):
@@ -133,14 +134,12 @@ class Host:
     def serve(self, *options, name="localhost"):
         """Serves the host's array over HTTPS, under a name that has to be looked up, and lets the host trust it.
         @return the provider's URL"""
-        ready, certificate = self.directory / "url", self.directory / "cert.pem"
-        os.mkfifo(ready)
+        certificate = self.directory / "cert.pem"
         words = ["serve", "--cert", certificate, "--key", self.directory / "key.pem", "--cert-name", name, *options,
                  self.array]
-        with ready.open("w+b", buffering=0) as url:
-            self.server = subprocess.Popen([str(programs() / "orkasim"), *map(str, words)], stdin=subprocess.DEVNULL,
-                                           stdout=url)
-            port = re.match(rb"https://[^/]*:(\d+)/", url.readline()).group(1).decode()
+        self.server = subprocess.Popen([str(programs() / "orkasim"), *map(str, words)], stdin=subprocess.DEVNULL,
+                                       stdout=subprocess.PIPE)
+        port = re.match(rb"https://[^/]*:(\d+)/", self.server.stdout.readline()).group(1).decode()
         (self.root / "certs").mkdir(exist_ok=True)
         shutil.copy(certificate, self.root / "certs" / f"{name}_{port}.pem")
         return f"https://{name}:{port}/orka"
