@@ -7,7 +7,7 @@ import os
 import subprocess
 import unittest
 
-from fleet import CONTAINERS, GOLD, TOP, Fleet
+from fleet import CONTAINERS, GOLD, TOP, Fleet, build
 
 VM = ("-n", "vm", "-c", GOLD)
 
@@ -145,6 +145,17 @@ class Views(unittest.TestCase):
         self.assertNotEqual(self.fleet.bound()["vm"], first)
         self.assertEqual(self.a.statuses("gold")[self.uuid("vm")], "accessible")
 
+
+    def test_a_host_is_brought_up_beside_one_that_is_up_with_https_only(self):
+        def refused(status, text, *words):
+            told = subprocess.run([TOP / "lab/up", "--build", build(), "--root", self.fleet.directory / "d", *words],
+                                  check=False, capture_output=True, text=True)
+            self.assertEqual((told.returncode, told.stdout), (status, ""), told.stderr)
+            self.assertIn(text, told.stderr)
+
+        refused(1, "no orkasim serves the array of ", "--beside", self.b.root)
+        refused(1, "there is no root ", "--beside", self.fleet.directory / "nowhere")
+        refused(2, "--beside goes without --https, --topology and --name", "--beside", self.a.root, "--https")
 
     def test_the_document_shows_what_happens(self):
         run = subprocess.run(["python3", TOP / "tests/cli/run_tour.py", TOP / "docs/fleet.md"], cwd=TOP, check=False,
