@@ -12,9 +12,14 @@ namespace Orka {
 
 namespace {
 
+/// Volumes are looked up by ids, which lie anywhere in their index: where it does not fit, each look-up reads pages
+/// anew. This much holds the index of a hundred thousand.
+constexpr int cacheKib = 8 << 10;
+
 std::unique_ptr<Sqlite::Database> open(std::string const &path, std::chrono::milliseconds busyTimeout) {
     Sqlite::Options options;
     options.busyTimeout = busyTimeout;
+    options.cacheKib = cacheKib;
     return onFile([&] {
         return std::make_unique<Sqlite::Database>(path, arrayFileIdentity(), Sqlite::Mode::ReadWrite, options);
     });

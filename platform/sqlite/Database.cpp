@@ -55,7 +55,7 @@ Database::Database(std::string const &path, Identity const &identity, Mode mode,
     }
     open(options, false);
     checkIdentity();
-    configure();
+    configure(options);
 }
 
 Database::~Database() = default;
@@ -147,13 +147,16 @@ void Database::createLayout() {
     transaction.commit();
 }
 
-void Database::configure() {
+void Database::configure(Options const &options) {
     execute("PRAGMA journal_mode=DELETE;"
             "PRAGMA synchronous=EXTRA;"
             "PRAGMA foreign_keys=ON;"
             "PRAGMA temp_store=MEMORY;"
             "PRAGMA cell_size_check=ON;"
             "PRAGMA trusted_schema=OFF");
+    if (options.cacheKib) {
+        execute("PRAGMA cache_size=-" + std::to_string(*options.cacheKib));
+    }
     if (mode_ == Mode::QueryOnly) {
         execute("PRAGMA query_only=ON");
     }

@@ -33,6 +33,15 @@ TEST_F(AccessTest, SetsEveryConnectionUpForDurability) {
     EXPECT_EQ(pragma(database, "query_only"), "0");
 }
 
+TEST_F(AccessTest, KeepsAsMuchOfAFileAsItIsTold) {
+    Sqlite::Options options;
+    options.cacheKib = 8192;
+    Database database(makeFile("a.db"), kind(), Mode::ReadWrite, options);
+    EXPECT_EQ(pragma(database, "cache_size"), "-8192");
+    Database usual(at("a.db"), kind(), Mode::ReadWrite);
+    EXPECT_EQ(pragma(usual, "cache_size"), "-2000");
+}
+
 TEST_F(AccessTest, TakesAFileBackOutOfAnotherJournalMode) {
     plainSql(makeFile("a.db"), "PRAGMA journal_mode=WAL");
     Database database(at("a.db"), kind(), Mode::ReadWrite);

@@ -15,6 +15,7 @@
 #include <chrono>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -51,6 +52,8 @@ enum class Mode {
 struct Options {
     /// How long a statement waits for another process's lock. 0 never waits, which an event loop wants.
     std::chrono::milliseconds busyTimeout{5000};
+    /// How much of the file is kept in memory at most, in KiB, taken as pages are read; nothing: SQLite's own 2000.
+    std::optional<int> cacheKib = std::nullopt;
 };
 
 class Database {
@@ -99,7 +102,7 @@ private:
 
     void open(Options const &options, bool openedAgain);
     void checkIdentity();
-    void configure();
+    void configure(Options const &options);
     void createLayout();
     Statement take(std::string_view sql);
     void giveBack(Statement statement) noexcept;
