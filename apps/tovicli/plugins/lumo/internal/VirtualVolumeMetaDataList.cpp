@@ -13,6 +13,12 @@ using namespace Plexa;
 
 namespace TarselCli::LumoNamespace {
 
+namespace {
+
+constexpr char const *structureName = "LumoMetaData";
+
+} // namespace
+
 boost::shared_ptr<VirtualVolumeMetaDataList> VirtualVolumeMetaDataList::New() {
     return boost::make_shared<VirtualVolumeMetaDataList>();
 }
@@ -32,7 +38,7 @@ OutputSpecPtr VirtualVolumeMetaDataList::GetOutputSpecInternal() {
 }
 
 StructPtr VirtualVolumeMetaDataList::GetOutputStructure() {
-    StructPtr const pair = MetaObj::MetaStruct::New("LumoMetaData");
+    StructPtr const pair = MetaObj::MetaStruct::New(structureName);
     pair->SetField("key", MetaObj::MetaString::New());
     pair->SetField("value", MetaObj::MetaString::New());
     return pair;
@@ -52,7 +58,8 @@ void VirtualVolumeMetaDataList::ExecuteInternal(InputPtr const &input, OutputPtr
     std::unique_ptr<LumoMetadata, void (*)(LumoMetadata *)> const owner(metadata, LumoLib_FreeLumoMetadata);
     ListPtr const list = makeStructList(GetOutputStructure());
     for (LumoMetadataEntry const *entry = metadata->first; entry != nullptr; entry = entry->next) {
-        StructPtr const pair = GetOutputStructure();
+        // Not from the schema: its empty texts would be made for each pair, only to be replaced.
+        StructPtr const pair = MetaObj::MetaStruct::New(structureName);
         pair->SetField("key", entry->key);
         pair->SetField("value", entry->value);
         list->Append(pair);
