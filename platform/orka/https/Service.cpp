@@ -5,6 +5,7 @@
 
 #include "RandomUuid.h"
 #include "https/Bytes.h"
+#include "https/HeldLists.h"
 #include "https/Protocol.h"
 #include "https/ServiceOperations.h"
 
@@ -41,6 +42,9 @@ constexpr std::string_view statusTextOf(unsigned status) {
     }
 }
 
+/// A token and a function each: what counts is their elements.
+constexpr std::size_t heldListsMax = 10000;
+
 std::string errorBody(std::string_view code, std::string const &message) {
     return bodyOf(ErrorAnswer{{std::string(code), message}});
 }
@@ -58,7 +62,8 @@ ProviderService::ProviderService(Provider &provider, kj::Timer &timer, std::stri
     : provider_(provider)
     , timer_(timer)
     , path_(std::move(path))
-    , instance_(instance.empty() ? randomUuid() : std::move(instance)) {}
+    , instance_(instance.empty() ? randomUuid() : std::move(instance))
+    , held_(std::make_unique<HeldLists>(HeldLimits{heldListsMax, listItemsMax})) {}
 
 ProviderService::~ProviderService() noexcept = default;
 

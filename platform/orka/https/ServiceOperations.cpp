@@ -8,6 +8,7 @@
 
 #include <fmt/format.h>
 
+#include "https/HeldLists.h"
 #include "https/Protocol.h"
 
 namespace Orka {
@@ -21,7 +22,6 @@ using Answered = kj::Promise<Outcome<std::string>>;
 /// A request that does not say how long it waits, and the longest that one is worked on.
 constexpr int64_t defaultTimeoutMs = 30000;
 constexpr int64_t longestTimeoutMs = 120000;
-constexpr std::size_t heldListsMax = 64;
 
 std::size_t pageSizeOf(std::optional<int64_t> const &asked) {
     return static_cast<std::size_t>(std::clamp<int64_t>(asked.value_or(pageItemsMax), 1, pageItemsMax));
@@ -233,13 +233,6 @@ std::string ServiceOperations::newToken() const {
     return fmt::format("{}-{}", service.instance_, ++service.listCount_);
 }
 
-void ServiceOperations::hold(ProviderService::HeldList list) const {
-    service.held_.push_back(std::move(list));
-    if (service.held_.size() > heldListsMax) {
-        service.held_.pop_front();
-    }
-}
-
 std::string ServiceOperations::heldPage(std::string const &page, std::size_t most) const {
     // TOKEN.OFFSET
     auto const dot = page.rfind('.');
@@ -247,38 +240,51 @@ std::string ServiceOperations::heldPage(std::string const &page, std::size_t mos
     auto const *const end = page.data() + page.size();
     bool const isWhole =
         dot != std::string::npos && std::from_chars(page.data() + dot + 1, end, offset).ptr == end && offset > 0;
-    auto const found = std::find_if(service.held_.begin(), service.held_.end(), [&](auto const &list) {
-        return isWhole && list.token == std::string_view(page).substr(0, dot);
-    });
-    if (found == service.held_.end()) {
+    auto const *const pages = isWhole ? service.held_->find(std::string_view(page).substr(0, dot)) : nullptr;
+    if (pages == nullptr) {
         throw Wire::Failure(stalePageCode, "the page is not known any more; begin with the first one");
     }
-    return found->page(offset, most).body;
+    return (*pages)(offset, most);
 }
+
+namespace {
+
+struct Page {
+    std::string body;
+    bool isLast;
+};
+
+template <typename T>
+Page pageOf(std::vector<T> const &items, std::optional<std::string> const &version, std::string const &token,
+            std::size_t offset, std::size_t most) {
+    BodyWriter writer;
+    writer.begin();
+    if (version) {
+        writer.name("version", *version);
+        writer.flag("unchanged", false);
+    }
+    auto const next = offset + writer.slice("items", items, offset, most, pageBytesMax);
+    bool const isLast = next >= items.size();
+    if (!isLast) {
+        writer.text("nextPage", fmt::format("{}.{}", token, next));
+    }
+    writer.end();
+    return {writer.take(), isLast};
+}
+
+} // namespace
 
 template <typename T>
 std::string ServiceOperations::firstPage(std::shared_ptr<std::vector<T> const> items,
                                          std::optional<std::string> version, std::size_t most) const {
     auto const token = newToken();
-    auto page = [items = std::move(items), version = std::move(version),
-                 token](std::size_t offset, std::size_t pageItems) -> ProviderService::Page {
-        BodyWriter writer;
-        writer.begin();
-        if (version) {
-            writer.name("version", *version);
-            writer.flag("unchanged", false);
-        }
-        auto const next = offset + writer.slice("items", *items, offset, pageItems, pageBytesMax);
-        bool const isLast = next >= items->size();
-        if (!isLast) {
-            writer.text("nextPage", fmt::format("{}.{}", token, next));
-        }
-        writer.end();
-        return {writer.take(), isLast};
-    };
-    auto first = page(0, most);
+    auto first = pageOf(*items, version, token, 0, most);
     if (!first.isLast) {
-        hold({token, std::move(page)});
+        service.held_->hold(token, std::move(items), [&](std::shared_ptr<std::vector<T> const> kept) {
+            return [kept = std::move(kept), version, token](std::size_t offset, std::size_t pageItems) {
+                return pageOf(*kept, version, token, offset, pageItems).body;
+            };
+        });
     }
     return std::move(first.body);
 }

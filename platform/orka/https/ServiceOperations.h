@@ -48,7 +48,6 @@ struct ServiceOperations {
 
 private:
     std::string newToken() const;
-    void hold(ProviderService::HeldList list) const;
 };
 
 } // namespace Orka

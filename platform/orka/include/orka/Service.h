@@ -4,17 +4,14 @@
 // simulator serves an array file with it, tests serve what they like.
 //
 // It believes a client as little as a client believes it: bodies are bounded, checked and refused with a sentence. It
-// holds the lists whose pages somebody may still ask for, the newest 64 of them. Requests are independent of each
-// other; what the provider beneath keeps in order is in order.
+// holds the lists whose pages somebody may still ask for, as many elements as one list may have. Requests are
+// independent of each other; what the provider beneath keeps in order is in order.
 #pragma once
 
-#include <deque>
-#include <functional>
+#include <cstdint>
 #include <memory>
-#include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include <kj/compat/http.h>
 #include <kj/timer.h>
@@ -22,6 +19,10 @@
 #include "orka/Provider.h"
 
 namespace Orka {
+
+namespace Https {
+class HeldLists;
+}
 
 class ProviderService final : public kj::HttpService {
 public:
@@ -45,15 +46,6 @@ private:
         unsigned status;
         std::string body;
     };
-    /// A list of which pages are left.
-    struct Page {
-        std::string body;
-        bool isLast;
-    };
-    struct HeldList {
-        std::string token;
-        std::function<Page(std::size_t offset, std::size_t most)> page;
-    };
 
     kj::Promise<Reply> answer(std::string_view operation, std::string body);
     kj::Promise<void> send(Response &response, Reply const &reply) const;
@@ -63,7 +55,7 @@ private:
     std::string path_;
     std::string instance_;
     uint64_t listCount_ = 0;
-    std::deque<HeldList> held_;
+    std::unique_ptr<Https::HeldLists> held_;
 };
 
 } // namespace Orka

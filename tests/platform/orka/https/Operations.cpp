@@ -11,6 +11,9 @@ protected:
     HttpsOperationTest() {
         serve();
     }
+
+    /// A list of three pages in the container of gold.
+    void makeManyVolumes();
 };
 
 TEST_F(HttpsOperationTest, answersAsTheArrayBehindIt) {
@@ -113,13 +116,17 @@ TEST_F(HttpsOperationTest, asksForAListAnewOnlyWhenItHasChanged) {
     EXPECT_EQ(get(client_->queryStorageArray(context())).version, third.version);
 }
 
+void HttpsOperationTest::makeManyVolumes() {
+    Stranger(at("test.array"))
+        .execute(
+            "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 2500) "
+            "INSERT INTO volume (uuid, container, kind, directory_name, size_mb, committed_mb, block_size, vm_uuid) "
+            "SELECT printf('30000000-0000-4000-8000-%012d', i), (SELECT seq FROM container WHERE name = 'gold'), 0, "
+            "'d' || i, 1, 0, 4096, '' FROM n");
+}
+
 TEST_F(HttpsOperationTest, readsListsOfManyPages) {
-    Stranger many(at("test.array"));
-    many.execute(
-        "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 2500) "
-        "INSERT INTO volume (uuid, container, kind, directory_name, size_mb, committed_mb, block_size, vm_uuid) "
-        "SELECT printf('30000000-0000-4000-8000-%012d', i), (SELECT seq FROM container WHERE name = 'gold'), 0, "
-        "'d' || i, 1, 0, 4096, '' FROM n");
+    makeManyVolumes();
     auto const all = get(client_->queryVirtualVolumesOfContainer(context(), goldId, 1 << 20));
     EXPECT_EQ(all, get(embedded_->queryVirtualVolumesOfContainer(context(), goldId, 1 << 20)));
     EXPECT_EQ(requests_, 3);
@@ -131,6 +138,26 @@ TEST_F(HttpsOperationTest, readsListsOfManyPages) {
     }
     EXPECT_EQ(get(client_->queryVirtualVolumesById(context(), goldId, ids)).size(), ids.size());
     EXPECT_TRUE(get(client_->queryVirtualVolumesById(context(), goldId, {})).empty());
+}
+
+TEST_F(HttpsOperationTest, readsLongListsForAWholeFleetAtOnce) {
+    makeManyVolumes();
+    constexpr int hosts = 40;
+    constexpr int listsPerHost = 5;
+    std::vector<std::unique_ptr<Orka::Provider>> clients;
+    kj::Vector<kj::Promise<Orka::Outcome<std::vector<Orka::ConfigVolume>>>> wanted;
+    for (int host = 0; host < hosts; ++host) {
+        clients.push_back(newClient());
+        for (int list = 0; list < listsPerHost; ++list) {
+            wanted.add(
+                clients.back()->queryVirtualVolumesOfContainer(context(), goldId, 1 << 20).eagerlyEvaluate(nullptr));
+        }
+    }
+    auto const expected = get(embedded_->queryVirtualVolumesOfContainer(context(), goldId, 1 << 20));
+    for (auto &promise : wanted) {
+        EXPECT_EQ(get(kj::mv(promise)), expected);
+    }
+    EXPECT_EQ(requests_, hosts * listsPerHost * 3) << "no list was begun anew";
 }
 
 TEST_F(HttpsOperationTest, losesNoUpdateOfManyHosts) {
