@@ -7,7 +7,7 @@ import os
 import subprocess
 import unittest
 
-from fleet import CONTAINERS, GOLD, TOP, Fleet, build
+from fleet import CONTAINERS, GOLD, TOP, Fleet, build, kill
 
 VM = ("-n", "vm", "-c", GOLD)
 
@@ -132,6 +132,14 @@ class Views(unittest.TestCase):
             self.assertEqual((again.status, json.loads(again.err)["error"]["code"]), (1, code), again)
         self.a.done("orkaprovider", "add", "--vp-name", "lab", "--vp-url", self.a.url)
         self.refused(self.a.lumo("orkaprovider", "add", "--vp-name", "lab", "--vp-url", self.a.url), "already exists")
+
+    def test_a_list_that_cannot_be_asked_for_is_empty_and_says_so(self):
+        kill(int((self.a.root / "run/lab.orkasim").read_text().split()[0]))
+        for host in self.fleet.hosts:
+            told = host.tool("--format", "json", "storage", "internal", "lumo", "storagecontainer", "checklumos", "--path",
+                             self.gold(host))
+            self.assertEqual((told.status, json.loads(told.out)), (0, []))
+            self.assertRegex(json.loads(told.err)["warnings"][0], r"\Athe provider at \S+ cannot be reached: ")
 
     def test_an_endpoint_that_two_hosts_can_use_is_kept(self):
         """A host that cannot use the endpoint of a volume takes another one, for all."""
