@@ -41,6 +41,8 @@ def short(path):
         return "ld.so"
     if path.startswith("/proc/self/fd/"):
         return "the plug-in, by its descriptor"
+    if name in ("???", "?"):
+        return "unknown"
     return re.sub(r"\.so\..*$", ".so", name)
 
 
@@ -101,7 +103,8 @@ def instructions_by_library(text):
             is_call = True
         elif re.match(r"[0-9+*-]", line):
             counts[library] += int(line.split()[-1])
-    return counts
+    # valgrind's own are no part of the program.
+    return collections.Counter({name: count for name, count in counts.items() if not name.startswith("vgpreload")})
 
 
 def bindings_by_library(text):
@@ -184,9 +187,10 @@ def profile(build, env, commands, rounds):
         nothing = [build.program("bench_nothing")]
         for name, command in commands:
             ours, floor = profiler.times(command, rounds, scratch)
-            # Each command is measured in turns with it; the first one's turns serve the table.
-            result.setdefault("nothing", {**floor, **profiler.counts(nothing, scratch)})
-            result[name] = {**ours, **profiler.counts(command, scratch)}
+            # Each command is compared with the turns that were beside its own; the first one's serve the column.
+            if not result:
+                result["nothing"] = {**floor, "floor": floor, **profiler.counts(nothing, scratch)}
+            result[name] = {**ours, "floor": floor, **profiler.counts(command, scratch)}
     return result
 
 
@@ -203,12 +207,15 @@ def render(result):
     libraries = sorted((w for w in works if w.startswith("program")),
                        key=lambda work: -sum(result[name]["work"].get(work, 0) for name in names))
     big = [work for work in libraries if max(result[name]["work"].get(work, 0) for name in names) >= 0.005]
-    rows = [["start to exit, milliseconds, not sampled"] + [f"{result[name]['wall']:.2f}" for name in names]]
-    # Sampling makes a run longer; shares of the floor say the same with and without.
-    whole = sum(result["nothing"]["work"].values()) / 100
-    rows.append(["on the processor in all"] + [f"{sum(result[name]['work'].values()) / whole:.0f}" for name in names])
-    for work in [*(row for row in FIRST_ROWS if row in works), *big]:
-        rows.append([work] + [f"{result[name]['work'].get(work, 0) / whole:.1f}" for name in names])
+    rows = [["start to exit, milliseconds, not sampled"] + [f"{result[name]['wall']:.2f}" for name in names],
+            ["the same of the floor, in turns with it"] + [f"{result[name]['floor']['wall']:.2f}" for name in names]]
+
+    def shares(spent):
+        # Sampling makes a run longer; shares of the floor say the same with and without.
+        return [f"{spent(result[name]['work']) * 100 / sum(result[name]['floor']['work'].values()):.1f}" for name in names]
+    rows.append(["on the processor in all", *shares(lambda work: sum(work.values()))])
+    for which in [*(row for row in FIRST_ROWS if row in works), *big]:
+        rows.append([which, *shares(lambda work, which=which: work.get(which, 0))])
     lines = ["Time on the processor, in hundredths of what the program takes in all that does nothing (what is left of the whole",
              "time is waiting):", "", *table(head, rows), ""]
 

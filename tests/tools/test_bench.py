@@ -207,7 +207,7 @@ class Profile(unittest.TestCase):
 
     def test_instructions_count_where_they_were_spent(self):
         text = ("ob=(1) /lib/libc.so.6\nfn=(1) puts\n10 5\n+2 7\ncob=(2) /lib/ld-linux-x86-64.so.2\ncfn=(2) x\ncalls=1 3\n* 1000\n"
-                "ob=(2)\nfn=(2)\n3 1000\n")
+                "ob=(2)\nfn=(2)\n3 1000\n" "ob=(3) /lib/vgpreload_core.so\nfn=(3)\n1 9\n")
         self.assertEqual(profile.instructions_by_library(text), {"libc.so": 12, "ld.so": 1000})
 
     def test_mapped_bytes_are_those_of_files(self):
