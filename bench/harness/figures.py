@@ -61,14 +61,16 @@ class Report:
         low, high = quartiles(values)
         self.line(name, median(values), low, high, goal, limit, detail, unit)
 
-    def growth(self, name, times, limit):
-        """Times by size, in the sizes' order: how much longer each size took than the one before it."""
+    def growth(self, name, times, limit, floors=None):
+        """Times by size, in the sizes' order: how much longer each size took than the one before it. What the floor took grew as
+        well, which is told."""
         times = list(times)
         for (small, small_times), (large, large_times) in zip(times, times[1:]):
+            told = f"; the floor grew {median(floors[large]) / median(floors[small]):.2f} times" if floors else ""
             base = median(small_times)
             low, high = quartiles(large_times)
             self.line(f"{name}: {small} to {large}", median(large_times) / base, low / base, high / base, limit, limit,
-                      f"{large / small:g} times as many")
+                      f"{large / small:g} times as many{told}")
 
     def point(self, plot, line, size, nanoseconds):
         """A point of the plot."""

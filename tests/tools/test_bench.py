@@ -56,6 +56,11 @@ class Arithmetic(unittest.TestCase):
         self.assertEqual((made.rows[0]["low"], made.rows[0]["high"]), (10.0, 15.0))
         self.assertTrue(made.is_over)
 
+    def test_growth_tells_what_the_floor_did(self):
+        made = Report(lambda _: None)
+        made.growth("g", {10: [4], 100: [40]}.items(), 10.5, {10: [2, 3, 4], 100: [36, 36, 36]})
+        self.assertEqual(made.rows[0]["detail"], "10 times as many; the floor grew 12.00 times")
+
     def test_a_median_at_its_bounds_is_within_them(self):
         for value, expected in ((2.0, "within the goal"), (2.01, "past the goal"), (3.0, "past the goal"), (3.01, "PAST THE LIMIT")):
             made = report(("r", value))
