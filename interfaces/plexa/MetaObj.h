@@ -75,6 +75,8 @@ public:
     std::string const &ViewValue() const;
 
 private:
+    friend class MetaStruct;
+
     bool set_ = false;
     std::string value_;
 };
@@ -132,7 +134,7 @@ public:
     std::vector<Field> const &ViewFields() const;
 
 private:
-    void Store(std::string const &field, boost::shared_ptr<MetaObject> const &value);
+    void Store(std::string const &field, boost::shared_ptr<MetaObject> value);
 
     std::string name_;
     std::vector<Field> fields_;

@@ -11,8 +11,11 @@ bool MetaObject::IsSet() const {
     return true;
 }
 
+// Values do not change, so all declarations of a type are one object: a long list of structures makes each from its
+// schema, and then replaces what the schema declares.
 boost::shared_ptr<MetaBool> MetaBool::New() {
-    return boost::make_shared<MetaBool>();
+    static auto const declaration = boost::make_shared<MetaBool>();
+    return declaration;
 }
 
 boost::shared_ptr<MetaBool> MetaBool::New(bool value) {
@@ -33,7 +36,8 @@ bool MetaBool::GetValue() const {
 }
 
 boost::shared_ptr<MetaInt> MetaInt::New() {
-    return boost::make_shared<MetaInt>();
+    static auto const declaration = boost::make_shared<MetaInt>();
+    return declaration;
 }
 
 boost::shared_ptr<MetaInt> MetaInt::New(int64_t value) {
@@ -54,7 +58,8 @@ int64_t MetaInt::GetValue() const {
 }
 
 boost::shared_ptr<MetaString> MetaString::New() {
-    return boost::make_shared<MetaString>();
+    static auto const declaration = boost::make_shared<MetaString>();
+    return declaration;
 }
 
 boost::shared_ptr<MetaString> MetaString::New(std::string const &value) {

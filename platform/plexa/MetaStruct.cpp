@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "plexa/MetaObj.h"
 
+#include <utility>
+
 #include <boost/make_shared.hpp>
 
 namespace Plexa::MetaObj {
@@ -30,7 +32,10 @@ void MetaStruct::SetField(std::string const &field, boost::shared_ptr<MetaString
 }
 
 void MetaStruct::SetField(std::string const &field, char const *value) {
-    Store(field, MetaString::New(value == nullptr ? std::string() : std::string(value)));
+    auto made = boost::make_shared<MetaString>();
+    made->set_ = true;
+    made->value_ = value == nullptr ? "" : value; // copied once: long lists are made of these
+    Store(field, std::move(made));
 }
 
 void MetaStruct::SetField(std::string const &field, int64_t value) {
@@ -46,7 +51,7 @@ void MetaStruct::SetField(std::string const &field, std::vector<std::string> con
     for (std::string const &text : value) {
         list->Append(MetaString::New(text));
     }
-    Store(field, list);
+    Store(field, std::move(list));
 }
 
 void MetaStruct::SetField(std::string const &field, bool value) {
@@ -83,14 +88,17 @@ std::vector<MetaStruct::Field> const &MetaStruct::ViewFields() const {
     return fields_;
 }
 
-void MetaStruct::Store(std::string const &field, boost::shared_ptr<MetaObject> const &value) {
+void MetaStruct::Store(std::string const &field, boost::shared_ptr<MetaObject> value) {
     for (Field &candidate : fields_) {
         if (candidate.name == field) {
-            candidate.value = value;
+            candidate.value = std::move(value);
             return;
         }
     }
-    fields_.push_back({field, value});
+    if (fields_.empty()) {
+        fields_.reserve(2); // few structures have less; a long list then makes half as many allocations
+    }
+    fields_.push_back({field, std::move(value)});
 }
 
 } // namespace Plexa::MetaObj
