@@ -11,11 +11,8 @@ bool MetaObject::IsSet() const {
     return true;
 }
 
-// Values do not change, so all declarations of a type are one object: a long list of structures makes each from its
-// schema, and then replaces what the schema declares.
 boost::shared_ptr<MetaBool> MetaBool::New() {
-    static auto const declaration = boost::make_shared<MetaBool>();
-    return declaration;
+    return boost::make_shared<MetaBool>();
 }
 
 boost::shared_ptr<MetaBool> MetaBool::New(bool value) {
@@ -36,8 +33,7 @@ bool MetaBool::GetValue() const {
 }
 
 boost::shared_ptr<MetaInt> MetaInt::New() {
-    static auto const declaration = boost::make_shared<MetaInt>();
-    return declaration;
+    return boost::make_shared<MetaInt>();
 }
 
 boost::shared_ptr<MetaInt> MetaInt::New(int64_t value) {
@@ -58,8 +54,7 @@ int64_t MetaInt::GetValue() const {
 }
 
 boost::shared_ptr<MetaString> MetaString::New() {
-    static auto const declaration = boost::make_shared<MetaString>();
-    return declaration;
+    return boost::make_shared<MetaString>();
 }
 
 boost::shared_ptr<MetaString> MetaString::New(std::string const &value) {
