@@ -136,8 +136,8 @@ class Views(unittest.TestCase):
     def test_a_list_that_cannot_be_asked_for_is_empty_and_says_so(self):
         kill(int((self.a.root / "run/lab.orkasim").read_text().split()[0]))
         for host in self.fleet.hosts:
-            told = host.tool("--format", "json", "storage", "internal", "lumo", "storagecontainer", "checklumos", "--path",
-                             self.gold(host))
+            told = host.tool("--format", "json", "storage", "internal", "lumo", "storagecontainer", "checklumos",
+                             "--path", self.gold(host))
             self.assertEqual((told.status, json.loads(told.out)), (0, []))
             self.assertRegex(json.loads(told.err)["warnings"][0], r"\Athe provider at \S+ cannot be reached: ")
 

@@ -189,7 +189,7 @@ std::vector<Bug> mutationBugs() {
         {"accepts-taken-name", "Making a volume of a name that is taken gives the one that is there.",
          "volume/create/name-taken", put<AcceptsTakenName>},
         {"looks-then-makes", "Of two that make one name at once, the loser is told that it has made it.",
-         "concurrency/create/two", put<LooksThenMakes>},
+         "concurrency/create/sixteen", put<LooksThenMakes>},
         {"clamps-size", "A size above the maximum becomes the default.", "volume/create/size-above-maximum",
          put<ClampsSize>},
         {"negative-is-default", "A negative size becomes the default.", "volume/create/size-negative",

@@ -62,8 +62,10 @@ size_t theWinner(std::vector<Outcome<T>> const &outcomes, std::initializer_list<
 }
 
 void createOneName(Probe &probe, size_t count) {
+    // Two that meet are a matter of luck, the more so with a network in between.
+    constexpr int rounds = 10;
     auto const providers = connections(probe, count);
-    for (int round = 0; round < 5; ++round) {
+    for (int round = 0; round < rounds; ++round) {
         auto const spec = probe.freshSpec();
         Answers<VirtualVolume> promises;
         for (auto const &provider : providers) {
