@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Answers.h"
 
+#include "VolumeRows.h"
 #include "wire/Failure.h"
 
 namespace Orka {
@@ -33,6 +34,10 @@ std::optional<RememberedAnswer> recall(Sqlite::Database &database, std::string c
     RememberedAnswer answer;
     if (!row.isNull(1)) {
         answer.created = CreatedVolume{row.text(1), row.integer(2), row.integer(3)};
+        requireId(database, answer.created->uuid, "the answer to an earlier request");
+        if (answer.created->sizeMb <= 0 || answer.created->blockSize <= 0) {
+            failDamaged(database, "the answer to an earlier request has sizes that cannot be");
+        }
     }
     return answer;
 }

@@ -78,6 +78,10 @@ std::vector<StorageContainer> readContainers(Sqlite::Database &database) {
         container.id = rows.text(1);
         container.name = rows.text(2);
         container.maxLumoSizeMb = rows.integer(3);
+        requireId(database, container.id, "a storage container");
+        if (container.maxLumoSizeMb <= 0) {
+            failDamaged(database, "the storage container " + container.id + " has no size");
+        }
         for (auto const seq = rows.integer(0); more && holders.integer(0) == seq; more = holders.step()) {
             container.arrayIds.push_back(holders.text(1));
         }

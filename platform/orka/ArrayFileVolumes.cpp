@@ -46,6 +46,7 @@ std::vector<ConfigVolume> ArrayFile::configVolumes(std::string const &containerI
         rows.bind(1, container.seq).bind(2, std::max<int64_t>(max, 0));
         while (rows.step()) {
             volumes.push_back({rows.text(0), rows.text(1), optionalText(rows, 2)});
+            requireId(*database_, volumes.back().uuid, "a virtual volume");
         }
         return volumes;
     });
@@ -84,7 +85,7 @@ std::optional<VirtualVolume> ArrayFile::volumeByDirectoryName(std::string const 
         if (!row.step()) {
             return std::nullopt;
         }
-        return volumeOf(row);
+        return volumeOf(*database_, row);
     });
 }
 
@@ -93,7 +94,7 @@ std::vector<VirtualVolume> ArrayFile::boundVolumes() {
         std::vector<VirtualVolume> volumes;
         auto rows = database_->query(std::string(selectVolumes) + "WHERE v.bound_to IS NOT NULL ORDER BY v.seq");
         while (rows.step()) {
-            volumes.push_back(volumeOf(rows));
+            volumes.push_back(volumeOf(*database_, rows));
         }
         return volumes;
     });

@@ -99,7 +99,7 @@ INSERT INTO host_context VALUES (1, NULL);
 
 Sqlite::Identity const &arrayFileIdentity() {
     // "TvAr"
-    static Sqlite::Identity const identity{0x54764172, 1, schema, "the array file"};
+    static Sqlite::Identity const identity{0x54764172, 1, schema, "the array file", true};
     return identity;
 }
 

@@ -29,12 +29,19 @@ struct VolumeRow {
 /// The volume with an id, in any accepted spelling. @throws Wire::Failure NoSuchContainer, NoSuchVolume
 VolumeRow requireVolume(Sqlite::Database &database, std::string const &containerId, std::string const &uuid);
 
+/// An array file may be anybody's, and a row breaks the layout's rules when they were off as it was written.
+/// @throws Wire::Failure FileMalformed, with the path and what is wrong
+[[noreturn]] void failDamaged(Sqlite::Database const &database, std::string const &what);
+/// @throws Wire::Failure FileMalformed for an id that is not canonical; `whose` says whose it is
+void requireId(Sqlite::Database const &database, std::string const &id, char const *whose);
+
 /// Asks for volumes as volumeOf() reads them, the number of the row in column 0; conditions follow.
 inline constexpr char const *selectVolumes =
     "SELECT v.seq, v.uuid, c.id, v.kind, coalesce(v.directory_name, ''), v.size_mb, v.committed_mb, v.unshared_mb, "
     "v.profile, v.block_size, v.vm_uuid, e.uid "
     "FROM volume v CROSS JOIN container c ON c.seq = v.container LEFT JOIN endpoint e ON e.seq = v.bound_to ";
-VirtualVolume volumeOf(Sqlite::Query const &row);
+/// @throws Wire::Failure FileMalformed for one that no array has
+VirtualVolume volumeOf(Sqlite::Database const &database, Sqlite::Query const &row);
 
 /// A nullable column.
 std::optional<std::string> optionalText(Sqlite::Query const &row, int column);

@@ -3,6 +3,7 @@
 
 #include <cerrno>
 #include <new>
+#include <set>
 #include <utility>
 
 #include <fcntl.h>
@@ -128,6 +129,33 @@ void Database::checkIdentity() {
     if (header.userVersion != identity_.userVersion) {
         throw Error(ErrorKind::Malformed,
                     name() + " is damaged: it says layout " + std::to_string(header.userVersion) + ", which never was");
+    }
+    if (identity_.isFromOthers) {
+        checkLayout();
+    }
+}
+
+void Database::checkLayout() {
+    // SQLite keeps each statement as it was written, from its first word to before its semicolon.
+    std::string_view const schema = identity_.schema;
+    std::size_t expected = 0;
+    for (std::size_t at = schema.find("CREATE "); at != std::string_view::npos; at = schema.find("CREATE ", at + 1)) {
+        ++expected;
+    }
+    std::set<std::size_t> found;
+    Query made(*this, "SELECT sql FROM sqlite_schema WHERE sql IS NOT NULL");
+    while (made.step()) {
+        std::string const statement = made.text(0);
+        std::size_t const at = schema.find(statement + ";");
+        bool const isOurs = statement.starts_with("CREATE ") && at != std::string_view::npos;
+        if (!isOurs || !found.insert(at).second) {
+            throw Error(ErrorKind::Malformed, named(identity_.kindName, path_) +
+                                                  " is damaged: it holds something that does not belong there");
+        }
+    }
+    if (found.size() != expected) {
+        throw Error(ErrorKind::Malformed,
+                    named(identity_.kindName, path_) + " is damaged: a part of its layout is gone");
     }
 }
 

@@ -1,4 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include <string>
+
 #include "Translate.h"
 #include "sqlite/Database.h"
 #include "sqlite/Transaction.h"
@@ -7,21 +9,27 @@
 namespace Store {
 namespace {
 
-Volume readVolume(Sqlite::Query const &row) {
-    return {row.text(0), row.text(1), row.text(2), static_cast<VolumeState>(row.integer(3))};
+Volume readVolume(Sqlite::Database const &database, Sqlite::Query const &row) {
+    Volume volume{row.text(0), row.text(1), row.text(2), static_cast<VolumeState>(row.integer(3))};
+    if (volume.state < VolumeState::Mounted || volume.state > VolumeState::Removing) {
+        throw Sqlite::Error(Sqlite::ErrorKind::Malformed, "the host store '" + database.path() +
+                                                              "' is damaged: it knows no state " +
+                                                              std::to_string(row.integer(3)) + " of config volumes");
+    }
+    return volume;
 }
 
 /// Every row of a query whose columns are uuid, container id, directory name and state.
-std::vector<Volume> readAll(Sqlite::Query &query) {
+std::vector<Volume> readAll(Sqlite::Database const &database, Sqlite::Query &query) {
     std::vector<Volume> volumes;
     while (query.step()) {
-        volumes.push_back(readVolume(query));
+        volumes.push_back(readVolume(database, query));
     }
     return volumes;
 }
 
-std::optional<Volume> readOne(Sqlite::Query &query) {
-    return query.step() ? std::optional<Volume>(readVolume(query)) : std::nullopt;
+std::optional<Volume> readOne(Sqlite::Database const &database, Sqlite::Query &query) {
+    return query.step() ? std::optional<Volume>(readVolume(database, query)) : std::nullopt;
 }
 
 /// Only a record that is still in the state that was seen: another process may have gone on meanwhile.
@@ -99,7 +107,7 @@ std::vector<Volume> HostStore::volumes() {
         }
         Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM volume v "
                                        "JOIN file_system f ON f.id = v.file_system ORDER BY v.id");
-        return readAll(query);
+        return readAll(*database, query);
     });
 }
 
@@ -111,7 +119,7 @@ std::optional<Volume> HostStore::volume(std::string_view uuid) {
         }
         Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM volume v "
                                        "JOIN file_system f ON f.id = v.file_system WHERE v.uuid = ?1");
-        return readOne(query.bind(1, uuid));
+        return readOne(*database, query.bind(1, uuid));
     });
 }
 
@@ -124,7 +132,7 @@ std::optional<Volume> HostStore::mountedVolume(std::string_view containerId, std
         Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM file_system f "
                                        "JOIN volume v ON v.file_system = f.id AND v.state IN (0, 2) "
                                        "WHERE f.container_id = ?1 AND v.directory_name = ?2");
-        return readOne(query.bind(1, containerId).bind(2, directoryName));
+        return readOne(*database, query.bind(1, containerId).bind(2, directoryName));
     });
 }
 
@@ -137,7 +145,7 @@ std::vector<Volume> HostStore::unmountedVolumes(std::string_view containerId, st
         Sqlite::Query query(*database, "SELECT v.uuid, f.container_id, v.directory_name, v.state FROM file_system f "
                                        "JOIN volume v ON v.file_system = f.id AND v.state IN (1, 3, 4) "
                                        "WHERE f.container_id = ?1 AND v.directory_name = ?2 ORDER BY v.id");
-        return readAll(query.bind(1, containerId).bind(2, directoryName));
+        return readAll(*database, query.bind(1, containerId).bind(2, directoryName));
     });
 }
 
@@ -153,7 +161,7 @@ std::vector<UnsettledVolume> HostStore::unsettledVolumes() {
                             "FROM volume v INDEXED BY volume_unsettled JOIN file_system f ON f.id = v.file_system "
                             "WHERE v.state IN (2, 3, 4) ORDER BY v.id");
         while (query.step()) {
-            volumes.push_back({readVolume(query), query.text(4)});
+            volumes.push_back({readVolume(*database, query), query.text(4)});
         }
         return volumes;
     });

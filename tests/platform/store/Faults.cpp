@@ -66,6 +66,19 @@ TEST_F(FaultsTest, fault_48_RefusesADamagedStore) {
     expectRefused(Wire::ErrorCode::FileMalformed);
 }
 
+TEST_F(FaultsTest, fault_48_RefusesAVolumeInNoState) {
+    HostStore store(root_, HostStore::Mode::ReadWrite);
+    store.addFileSystem({"gold", "c", {}});
+    store.putVolumes({{"v", "c", "d", Store::VolumeState::Mounted}}, {});
+    plainSql("PRAGMA ignore_check_constraints=1; UPDATE volume SET state = 7");
+    for (auto const &failure : {failureOf([&] { store.volumes(); }), failureOf([&] { store.volume("v"); })}) {
+        ASSERT_TRUE(failure);
+        EXPECT_EQ(failure->code(), Wire::ErrorCode::FileMalformed);
+        EXPECT_EQ(failure->sentence(),
+                  "the host store '" + file() + "' is damaged: it knows no state 7 of config volumes");
+    }
+}
+
 TEST_F(FaultsTest, fault_49_BusyAfterTheTimeoutAndNothingChanged) {
     HostStore store(root_, HostStore::Mode::ReadWrite, 30ms);
     store.setOrkaContext("kept");

@@ -39,6 +39,9 @@ struct Identity {
     std::string schema;
     /// For sentences, with its article: "the host store".
     std::string kindName;
+    /// A file that comes from others may say that it is one of ours and hold a view that never ends in the place of a
+    /// table. Where this is set, one that does not hold exactly what the schema makes is Malformed.
+    bool isFromOthers = false;
 };
 
 enum class Mode {
@@ -102,6 +105,7 @@ private:
 
     void open(Options const &options, bool openedAgain);
     void checkIdentity();
+    void checkLayout();
     void configure(Options const &options);
     void createLayout();
     Statement take(std::string_view sql);
