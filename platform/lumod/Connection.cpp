@@ -8,6 +8,7 @@
 #include <fmt/format.h>
 
 #include "Escape.h"
+#include "RequestCheck.h"
 #include "wire/Limits.h"
 
 namespace Lumod {
@@ -95,6 +96,9 @@ Wire::Request::Reader Connection::parse(uint64_t &id) {
         id = request.getId();
         // Visits everything, also what this version does not know, so that no handler meets a bad pointer half-way.
         request.totalSize();
+        // By a reader of its own, so that the handler's may still visit each word as often as it may.
+        capnp::SegmentArrayMessageReader checked(buffer.segments(), Wire::readerOptions(buffer.bodyBytes()));
+        readWhole(checked.getRoot<Wire::Request>());
         message_ = kj::mv(message);
         return request;
     } catch (kj::Exception const &exception) {

@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <cstring>
 
+#include <capnp/any.h>
 #include <gmock/gmock.h>
 
 #include "ServerFixture.h"
@@ -184,6 +185,30 @@ TEST_F(ConnectionTest, TheRequestsDeadlineEndsIt) {
     EXPECT_EQ(reply.code, ErrorCode::DeadlineExceeded);
     EXPECT_EQ(reply.id, 5U);
     EXPECT_TRUE(sink_.holds("trace-1 getStorageContainer failed with code 12"));
+}
+
+TEST_F(ConnectionTest, fault_24_NumbersWhereATextShouldBeAreAnInvalidRequest) {
+    auto const vendor = addUsualVendor();
+    // The request's own text, and one of what it asks.
+    for (unsigned const place : {0U, 1U}) {
+        capnp::MallocMessageBuilder message;
+        auto request = message.initRoot<Wire::Request>();
+        request.setVersion(Wire::PROTOCOL_VERSION);
+        request.setId(7);
+        request.initDeleteVirtualVolume().setContainerId(containerIdOf(1).c_str());
+        auto pointers = message.getRoot<capnp::AnyStruct>().getPointerSection();
+        if (place == 0) {
+            pointers[0].initAs<capnp::List<uint64_t>>(3);
+        } else {
+            pointers[1].getAs<capnp::AnyStruct>().getPointerSection()[1].initAs<capnp::List<uint64_t>>(3);
+        }
+        RawClient client(orderedPath());
+        WireReply const reply = ask(client, framedMessage(message));
+        EXPECT_EQ(reply.id, 7U) << place;
+        EXPECT_EQ(reply.code, ErrorCode::InvalidRequest) << place;
+        EXPECT_FALSE(client.isClosed()) << place;
+        EXPECT_TRUE(vendor->calls.empty()) << place;
+    }
 }
 
 TEST_F(ConnectionTest, fault_34_TheWallClockMovesNoDeadline) {
