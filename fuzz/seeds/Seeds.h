@@ -13,8 +13,11 @@ namespace Fuzz {
 /// Takes an input of the target in question, under a name of its own.
 using Keep = std::function<void(std::string_view name, std::string_view bytes)>;
 
-void makeMessageSeeds(Keep const &keep);        ///< one message of each kind
-void makeReplySeeds(Keep const &keep);          ///< a request's number and what answers it
-void makeProviderAnswerSeeds(Keep const &keep); ///< an operation's number and what a provider sends back
+void makeDatabaseSeeds(Keep const &arrayFiles, Keep const &hostStores); ///< sound files
+void makeMessageSeeds(Keep const &keep);                                ///< one message of each kind
+void makeReplySeeds(Keep const &keep);                                  ///< a request's number and what answers it
+void makeRequestSeeds(Keep const &keep);         ///< a socket's number and a request of each kind
+void makeProviderAnswerSeeds(Keep const &keep);  ///< an operation's number and what a provider sends back
+void makeProviderRequestSeeds(Keep const &keep); ///< a request for each operation
 
 } // namespace Fuzz

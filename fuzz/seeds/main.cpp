@@ -10,16 +10,23 @@
 
 namespace {
 
-struct Maker {
-    char const *target;
-    void (*make)(Fuzz::Keep const &keep);
-};
+/// Puts inputs into the folder of a target, in the place of those that were there.
+Fuzz::Keep keeping(std::filesystem::path const &root, std::string_view target) {
+    std::filesystem::path const folder = root / target;
+    std::filesystem::remove_all(folder);
+    std::filesystem::create_directories(folder);
+    return
+        [folder](std::string_view name, std::string_view bytes) { Fuzz::writeFile((folder / name).string(), bytes); };
+}
 
-constexpr Maker makers[] = {
-    {"compact_messages", Fuzz::makeMessageSeeds},
-    {"provider_answers", Fuzz::makeProviderAnswerSeeds},
-    {"replies", Fuzz::makeReplySeeds},
-};
+void make(std::filesystem::path const &root) {
+    Fuzz::makeDatabaseSeeds(keeping(root, "array_files"), keeping(root, "host_stores"));
+    Fuzz::makeMessageSeeds(keeping(root, "compact_messages"));
+    Fuzz::makeProviderAnswerSeeds(keeping(root, "provider_answers"));
+    Fuzz::makeProviderRequestSeeds(keeping(root, "provider_requests"));
+    Fuzz::makeReplySeeds(keeping(root, "replies"));
+    Fuzz::makeRequestSeeds(keeping(root, "requests"));
+}
 
 } // namespace
 
@@ -29,14 +36,7 @@ int main(int count, char const *const *arguments) {
         return 2;
     }
     try {
-        for (Maker const &maker : makers) {
-            std::filesystem::path const folder = std::filesystem::path(arguments[1]) / maker.target;
-            std::filesystem::remove_all(folder);
-            std::filesystem::create_directories(folder);
-            maker.make([&](std::string_view name, std::string_view bytes) {
-                Fuzz::writeFile((folder / name).string(), bytes);
-            });
-        }
+        make(arguments[1]);
     } catch (std::exception const &failure) {
         std::fprintf(stderr, "seeds: %s\n", failure.what());
         return 1;

@@ -23,11 +23,13 @@ namespace {
 using Fuzz::require;
 using namespace Orka;
 
-/// Every address is that of the one peer, which says the same over each connection.
+/// Every address is that of the one peer, which says the same over each connection. A connection takes a second to
+/// make, so that a list whose pages each have a next one meets the deadline, as it would elsewhere.
 class Network final : public kj::Network, public kj::NetworkAddress {
 public:
-    explicit Network(std::string_view says)
-        : says_(says) {}
+    Network(kj::Timer &timer, std::string_view says)
+        : timer_(timer)
+        , says_(says) {}
 
     kj::Promise<kj::Own<kj::NetworkAddress>> parseAddress(kj::StringPtr, kj::uint) override {
         return clone();
@@ -39,9 +41,11 @@ public:
         return {this, kj::NullDisposer::instance};
     }
     kj::Promise<kj::Own<kj::AsyncIoStream>> connect() override {
-        auto pipe = kj::newTwoWayPipe();
-        peers_.push_back(std::make_unique<Fuzz::Peer>(kj::mv(pipe.ends[0]), says_));
-        return kj::mv(pipe.ends[1]);
+        return timer_.afterDelay(1 * kj::SECONDS).then([this] {
+            auto pipe = kj::newTwoWayPipe();
+            peers_.push_back(std::make_unique<Fuzz::Peer>(kj::mv(pipe.ends[0]), says_));
+            return kj::mv(pipe.ends[1]);
+        });
     }
     kj::Own<kj::ConnectionReceiver> listen() override {
         KJ_UNIMPLEMENTED("nobody listens here");
@@ -54,6 +58,7 @@ public:
     }
 
 private:
+    kj::Timer &timer_;
     std::string says_;
     std::vector<std::unique_ptr<Fuzz::Peer>> peers_;
 };
@@ -236,7 +241,7 @@ int LLVMFuzzerTestOneInput(std::uint8_t const *data, std::size_t size) {
         return 0;
     }
     Fuzz::World world;
-    Network network(Fuzz::textOf(data + 1, size - 1));
+    Network network(world.timer(), Fuzz::textOf(data + 1, size - 1));
     auto const provider = makeProvider("https://array.test:8443/orka", {world.timer(), nullptr, &network, ""});
     ask(world, *provider, data[0]);
     return 0;

@@ -1,0 +1,1 @@
+PRAGMA foreign_keys=0; DROP TABLE container; CREATE VIEW container AS WITH RECURSIVE n(seq,id,name,max_lumo_size_mb) AS (SELECT 1,'0a1b2c3d-4e5f-6071-8293-a4b5c6d7e8f9','c',1 UNION ALL SELECT seq+1,id,name,1 FROM n) SELECT * FROM n;

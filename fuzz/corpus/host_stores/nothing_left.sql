@@ -1,0 +1,1 @@
+PRAGMA writable_schema=1; DELETE FROM sqlite_schema;

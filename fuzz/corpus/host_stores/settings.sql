@@ -1,0 +1,1 @@
+DELETE FROM setting; DELETE FROM endpoint_outage; INSERT INTO setting VALUES('x',char(27));
