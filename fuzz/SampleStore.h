@@ -13,12 +13,11 @@ inline constexpr char const *sampleVolume = "11111111-2222-3333-4444-55555555555
 /// Makes a host store with something of everything.
 /// @return its path
 inline std::string makeSampleStore(std::string const &root) {
-    using namespace Store;
-    HostStore store(root, HostStore::Mode::ReadWrite);
+    Store::HostStore store(root, Store::HostStore::Mode::ReadWrite);
     store.putProviders({{"provider", "file:///a.array", "text", {{"array", true, 1}, {"other", false, -1}}}});
     store.addFileSystem({"gold", sampleContainer, {"array"}});
-    store.putVolumes({{sampleVolume, sampleContainer, "directory", VolumeState::Mounted},
-                      {"22222222-2222-3333-4444-555555555555", sampleContainer, "away", VolumeState::Unmounted}},
+    store.putVolumes({{sampleVolume, sampleContainer, "directory", Store::VolumeState::Mounted},
+                      {"22222222-2222-3333-4444-555555555555", sampleContainer, "away", Store::VolumeState::Unmounted}},
                      {});
     store.setEndpointOutage("endpoint", true);
     store.setOrkaContext("context");

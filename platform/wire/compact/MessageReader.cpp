@@ -19,6 +19,7 @@ MessageReader::MessageReader(SegmentTable const &table, Word const *body)
 StructReader MessageReader::root() {
     Segment const &first = segments_.segments[0];
     first.require(first.begin, 1);
+    visits_.count(1); // the library looks at this word twice, and what it refuses is refused here
     return StructReader::at(first, first.begin, nestingMax);
 }
 

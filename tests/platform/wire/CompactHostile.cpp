@@ -157,6 +157,13 @@ TEST(CompactHostile, lists_of_nothing_are_refused_when_they_claim_to_be_long) {
     EXPECT_NE(read({replyOf(Wire::Reply::METADATA, listTo(0, ElementSize::Void, 3))}), "malformed");
 }
 
+TEST(CompactHostile, the_last_visit_that_is_allowed_is_the_librarys) {
+    // Five words, each of which may be visited four times: the root's pointer twice, the reply's three, and the
+    // elements.
+    EXPECT_NE(read({joined(replyOf(Wire::Reply::STORAGE_ARRAYS, listTo(0, ElementSize::Void, 15)), {0})}), "malformed");
+    EXPECT_EQ(read({joined(replyOf(Wire::Reply::STORAGE_ARRAYS, listTo(0, ElementSize::Void, 16)), {0})}), "malformed");
+}
+
 TEST(CompactHostile, huge_lists_are_refused) {
     constexpr std::uint64_t most = (std::uint64_t{1} << 29) - 1;
     for (std::uint64_t size = 0; size < 8; ++size) {
