@@ -47,13 +47,14 @@ class Suite:
                                check=True, stdout=file)
         return str(path)
 
-    def in_turns(self, usual, measure):
+    def in_turns(self, usual, measure, sizes=None):
         """Measures every size a few rounds at a time, in turns: growth compares sizes, and a machine's pace drifts.
 
-        @param usual rounds by size; measure a function of size and number of rounds that returns them as a list
+        @param usual rounds by size; measure a function of size and number of rounds that returns them as a list; sizes which,
+        if not all
         @return rounds by size
         """
-        rounds = {size: self.options.rounds or usual(size) for size in self.options.sizes}
+        rounds = {size: self.options.rounds or usual(size) for size in (self.options.sizes if sizes is None else sizes)}
         taken = {size: [] for size in rounds}
         while left := [size for size in rounds if len(taken[size]) < rounds[size]]:
             for size in left:
