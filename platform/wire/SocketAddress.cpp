@@ -15,10 +15,10 @@ namespace Wire {
 
 SocketAddress::SocketAddress(std::string const &path) {
     std::string usable = path;
-    if (path.size() >= sizeof address_.sun_path) {
-        std::size_t const slash = path.rfind('/');
-        std::string const directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
-        std::string const name = slash == std::string::npos ? path : path.substr(slash + 1);
+    std::size_t const slash = path.rfind('/');
+    if (path.size() >= sizeof address_.sun_path && slash != std::string::npos) {
+        std::string const directory = path.substr(0, slash + 1);
+        std::string const name = path.substr(slash + 1);
         directory_.reset(open(directory.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
         if (!directory_) {
             boost::system::error_code const error(errno, boost::system::system_category());

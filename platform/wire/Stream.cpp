@@ -40,11 +40,10 @@ int checkedRemainder(Deadline deadline) {
     return static_cast<int>(std::min<std::int64_t>(remainder.count(), INT32_MAX));
 }
 
+/// Whoever waits tries again, so that a signal, which ends this early, does no harm; the deadline ends it for good.
 void waitFor(int socket, short events, Deadline deadline) {
     pollfd entry{socket, events, 0};
-    if (poll(&entry, 1, checkedRemainder(deadline)) < 0 && errno != EINTR) {
-        throwSocketError(errno, "waiting for the peer");
-    }
+    poll(&entry, 1, checkedRemainder(deadline));
 }
 
 /// From now on a receive call ends when the deadline does, as far as the descriptor blocks at all.
@@ -69,7 +68,7 @@ bool receiveExactly(int socket, std::span<std::uint8_t> into, Deadline deadline)
             return false;
         } else if (got == 0) {
             throw Failure(ErrorCode::ConnectionLost, "the peer closed the connection in the middle of a message");
-        } else if (error != EINTR && error != EAGAIN && error != EWOULDBLOCK) {
+        } else if (error != EINTR && error != EAGAIN) {
             throwSocketError(error, "receiving");
         }
         if (done < into.size()) {
@@ -91,7 +90,12 @@ public:
         for (std::span<std::uint64_t const> const segment : segments) {
             body += segment.size_bytes();
         }
-        if (segments.size() > segmentCountMax || body > bodyLimit) {
+        if (segments.size() > segmentCountMax) {
+            throw Failure(ErrorCode::MessageTooLarge, "a message of " + std::to_string(segments.size()) +
+                                                          " segments has more than the allowed " +
+                                                          std::to_string(segmentCountMax));
+        }
+        if (body > bodyLimit) {
             throw Failure(ErrorCode::MessageTooLarge, "a message of " + std::to_string(body) +
                                                           " bytes is larger than the allowed " +
                                                           std::to_string(bodyLimit));
@@ -160,7 +164,7 @@ void sendSegments(int socket, std::span<std::span<std::uint64_t const> const> se
             if (sentBytes != nullptr) {
                 *sentBytes += static_cast<std::size_t>(taken);
             }
-        } else if (errno == EAGAIN || errno == EWOULDBLOCK) {
+        } else if (errno == EAGAIN) {
             waitFor(socket, POLLOUT, deadline);
         } else if (errno != EINTR) {
             throwSocketError(errno, "sending");

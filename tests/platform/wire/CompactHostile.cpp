@@ -217,6 +217,9 @@ TEST(CompactHostile, far_pointers_lead_somewhere_or_are_refused) {
     EXPECT_EQ(read({replyOf(Wire::Reply::FAILURE, farTo(1, 0, true)), pad}), "malformed") << "no such segment";
     EXPECT_EQ(read({replyOf(Wire::Reply::FAILURE, farTo(1, 1, true)), pad, {5, 0}}), "malformed") << "half a pad";
     EXPECT_EQ(read({replyOf(Wire::Reply::FAILURE, farTo(1, 0, true)), landing, {5, 0}}), "malformed") << "no far pad";
+    EXPECT_EQ(read({replyOf(Wire::Reply::FAILURE, farTo(1, 0, true)), {structTo(0, {1, 0}), pad[1]}, {5, 0}}),
+              "malformed")
+        << "a structure that looks like the number of a segment";
 }
 
 TEST(CompactHostile, texts_without_an_end_are_refused) {

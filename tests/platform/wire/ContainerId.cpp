@@ -30,6 +30,7 @@ TEST(ContainerId, refuses_what_is_no_uuid) {
              "0a1b2c3d-4e5f-6071-8293-a4b5c6d7e8f90",    // one too many
              "0a1b2c3d-4e5f-6071-8293a4b5c6d7e8f9",      // some hyphens
              "0a1b2c3-d4e5f-6071-8293-a4b5c6d7e8f9",     // in the wrong place
+             "0a1b2c3d04e5f-6071-8293-a4b5c6d7e8f9",     // a digit in a hyphen's place
              "0a1b2c3d-4e5f-6071-8293-a4b5c6d7e8fg",     // no digit
              "{0a1b2c3d-4e5f-6071-8293-a4b5c6d7e8f9",    // one brace
              "0a1b2c3d-4e5f-6071-8293-a4b5c6d7e8f9}",    // the other

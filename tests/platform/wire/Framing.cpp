@@ -19,6 +19,7 @@
 #include <capnp/serialize.h>
 
 #include "wire/Failure.h"
+#include "wire/Stream.h"
 #include "wire/UniqueFd.h"
 #include "wire/lumod.capnp.h"
 
@@ -63,6 +64,15 @@ ErrorCode codeOf(std::function<void()> const &work) {
         return ErrorCode::Success;
     } catch (Wire::Failure const &failure) {
         return failure.code();
+    }
+}
+
+std::string sentenceOf(std::function<void()> const &work) {
+    try {
+        work();
+        return "no failure";
+    } catch (Wire::Failure const &failure) {
+        return failure.sentence();
     }
 }
 
@@ -240,6 +250,32 @@ TEST_F(Framing, fault_23_a_peer_that_leaves_in_mid_message_is_a_failure) {
                   ErrorCode::ConnectionLost)
             << cut;
     }
+}
+
+TEST_F(Framing, tells_what_the_system_said_of_something_that_is_no_socket) {
+    Wire::UniqueFd const file(open("/dev/null", O_RDWR | O_CLOEXEC));
+    std::uint64_t const word = 0;
+    std::span<std::uint64_t const> const segment(&word, 1);
+    EXPECT_EQ(sentenceOf([&] {
+                  Wire::sendSegments(file.get(), {&segment, 1}, 8, in(patience));
+              }),
+              "sending failed: Socket operation on non-socket");
+    EXPECT_EQ(sentenceOf([&] { Wire::receiveTable(file.get(), 8, in(patience)); }),
+              "receiving failed: Socket operation on non-socket");
+}
+
+TEST_F(Framing, sends_no_message_that_the_other_end_would_refuse) {
+    std::vector<std::uint64_t> const words(3);
+    std::vector<std::span<std::uint64_t const>> const segments(Wire::segmentCountMax + 1, {words.data(), 1});
+    EXPECT_EQ(sentenceOf([&] { Wire::sendSegments(there_.get(), segments, 1000, in(patience)); }),
+              "a message of 65 segments has more than the allowed 64");
+    std::span<std::uint64_t const> const all(words);
+    EXPECT_EQ(sentenceOf([&] {
+                  Wire::sendSegments(there_.get(), {&all, 1}, 16, in(patience));
+              }),
+              "a message of 24 bytes is larger than the allowed 16");
+    there_.reset();
+    EXPECT_FALSE(Wire::receiveTable(here_.get(), 1000, in(patience)).has_value()) << "nothing was sent";
 }
 
 TEST_F(Framing, goes_on_after_an_interrupting_signal) {

@@ -85,12 +85,27 @@ TEST(SocketAddress, tells_that_the_directory_of_a_long_path_is_missing) {
     }
 }
 
-TEST(SocketAddress, refuses_a_name_that_is_too_long_in_any_directory) {
+TEST(SocketAddress, tells_that_the_directory_of_a_long_path_is_none) {
     try {
-        Wire::SocketAddress const address("/tmp/" + std::string(120, 'x'));
-        FAIL() << "a name of 120 characters was accepted";
+        Wire::SocketAddress const address("/dev/null/" + std::string(100, 'x'));
+        FAIL() << "a device was opened as a directory";
     } catch (Wire::Failure const &failure) {
-        EXPECT_EQ(failure.code(), Wire::ErrorCode::InvalidArgument);
+        EXPECT_EQ(failure.code(), Wire::ErrorCode::IoError);
+        EXPECT_EQ(failure.sentence(), "the directory of the socket /dev/null/" + std::string(100, 'x') +
+                                          " cannot be opened: Not a directory");
+    }
+}
+
+TEST(SocketAddress, refuses_a_name_that_is_too_long_in_any_directory) {
+    for (std::string const directory : {"/tmp/", "./", ""}) {
+        std::string const path = directory + std::string(120, 'x');
+        try {
+            Wire::SocketAddress const address(path);
+            FAIL() << "a name of 120 characters was accepted";
+        } catch (Wire::Failure const &failure) {
+            EXPECT_EQ(failure.code(), Wire::ErrorCode::InvalidArgument);
+            EXPECT_EQ(failure.sentence(), "the name of the socket " + path + " is too long");
+        }
     }
 }
 
