@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "store/Directory.h"
 
+#include <algorithm>
 #include <cerrno>
+#include <iterator>
 #include <system_error>
+#include <utility>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -15,11 +18,16 @@ namespace {
 
 constexpr mode_t directoryMode = 0755;
 
+constexpr std::pair<int, Wire::ErrorCode> codes[] = {
+    {ENOSPC, Wire::ErrorCode::DiskFull},    {EDQUOT, Wire::ErrorCode::DiskFull},
+    {EROFS, Wire::ErrorCode::FileReadOnly}, {EACCES, Wire::ErrorCode::FileReadOnly},
+    {EPERM, Wire::ErrorCode::FileReadOnly},
+};
+
 [[noreturn]] void cannotMake(std::string const &path, int systemError) {
-    throw Wire::Failure(systemError == ENOSPC || systemError == EDQUOT ? Wire::ErrorCode::DiskFull
-                        : systemError == EROFS || systemError == EACCES || systemError == EPERM
-                            ? Wire::ErrorCode::FileReadOnly
-                            : Wire::ErrorCode::IoError,
+    auto const *const known =
+        std::find_if(std::begin(codes), std::end(codes), [=](auto const &code) { return code.first == systemError; });
+    throw Wire::Failure(known != std::end(codes) ? known->second : Wire::ErrorCode::IoError,
                         "the directory '" + path + "' cannot be made: " + std::generic_category().message(systemError));
 }
 

@@ -29,6 +29,9 @@ TEST_F(VolumesTest, AnAbsentStoreHasNone) {
     EXPECT_FALSE(absent.mountedVolume("id-1", "one"));
     EXPECT_TRUE(absent.unmountedVolumes("id-1", "one").empty());
     EXPECT_TRUE(absent.unsettledVolumes().empty());
+    EXPECT_TRUE(absent.volumes().empty());
+    absent.checkIntegrity();
+    absent.putVolumes({}, {});
     EXPECT_FALSE(exists(absent.path()));
 }
 
@@ -49,6 +52,15 @@ TEST_F(VolumesTest, AnUnmountedOneIsNoMountAndRemembersItsName) {
     EXPECT_FALSE(store_.mountedVolume("id-1", "one"));
     EXPECT_EQ(store_.unmountedVolumes("id-1", "one").size(), 1U);
     EXPECT_EQ(store_.unsettledVolumes().size(), 1U);
+}
+
+TEST_F(VolumesTest, WhatIsSettledAlreadyIsLeftAsItIs) {
+    Volume const mounted = volume("v1", "one", VolumeState::Mounted);
+    Volume const unmounted = volume("v2", "two", VolumeState::Unmounted);
+    store_.putVolumes({mounted, unmounted}, {});
+    store_.putVolumes({}, {mounted, unmounted});
+    EXPECT_EQ(store_.volumes(), (std::vector<Volume>{mounted, unmounted}));
+    store_.checkIntegrity();
 }
 
 TEST_F(VolumesTest, SettlingGoesWithTheNextWrite) {
