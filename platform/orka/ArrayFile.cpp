@@ -107,10 +107,6 @@ bool ArrayFile::hasMoved() const {
     return onFile([&] { return database_->hasMoved(); });
 }
 
-bool ArrayFile::isReadOnly() const {
-    return onFile([&] { return database_->isReadOnly(); });
-}
-
 int64_t ArrayFile::dataVersion() {
     return onFile([&] { return database_->dataVersion(); });
 }

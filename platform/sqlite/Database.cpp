@@ -36,12 +36,12 @@ bool mayMakeFileBeside(std::string const &path) {
 
 bool exists(char const *path) {
     struct stat status {};
-    return path != nullptr && ::lstat(path, &status) == 0;
+    return ::lstat(path, &status) == 0;
 }
 
 /// SQLite takes some names for something other than a file (":memory:", "file:..."); one with a slash is always a file.
 std::string fileName(std::string const &path) {
-    return !path.empty() && path.front() == '/' ? path : "./" + path;
+    return path.front() == '/' ? path : "./" + path;
 }
 
 } // namespace
@@ -218,13 +218,10 @@ bool Database::hasMoved() const {
     return moved != 0;
 }
 
-bool Database::isReadOnly() const {
-    return mode_ == Mode::QueryOnly || sqlite3_db_readonly(handle_.get(), "main") == 1;
-}
-
 void Database::checkIntegrity() {
     Query check(*this, "PRAGMA quick_check(1)");
-    if (check.step() && check.textView(0) != "ok") {
+    check.step(); // at least one row, always
+    if (check.textView(0) != "ok") {
         throw Error(ErrorKind::Malformed, named(identity_.kindName, path_) + " is damaged: " + check.text(0));
     }
 }

@@ -19,12 +19,8 @@ Query::Query(Database &database, std::string_view sql)
     , statement_(database.take(sql)) {}
 
 Query::~Query() {
-    if (statement_) {
-        database_->giveBack(std::move(statement_));
-    }
+    database_->giveBack(std::move(statement_));
 }
-
-Query::Query(Query &&other) noexcept = default;
 
 Query &Query::bind(int parameter, int64_t value) {
     database_->check(sqlite3_bind_int64(statement_.get(), parameter, value));

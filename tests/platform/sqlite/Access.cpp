@@ -52,7 +52,6 @@ TEST_F(AccessTest, TakesAFileBackOutOfAnotherJournalMode) {
 TEST_F(AccessTest, QueryOnlyReadsAndNeverWrites) {
     Database database(makeFile("a.db"), kind(), Mode::QueryOnly);
     EXPECT_EQ(countItems(database), 1);
-    EXPECT_TRUE(database.isReadOnly());
     std::string const before = bytesOf(at("a.db"));
     for (char const *sql : {"INSERT INTO item (text) VALUES ('x')", "DELETE FROM item", "DROP TABLE item"}) {
         auto const error = errorOf([&] { database.query(sql).run(); });
@@ -85,6 +84,7 @@ TEST_F(AccessTest, ValuesComeBackAsTheyWereBound) {
 TEST_F(AccessTest, QueriesOfOneTextMayBeNested) {
     Database database(makeFile("a.db", 3), kind(), Mode::ReadWrite);
     int pairs = 0;
+    Query(database, "SELECT id FROM item").run(); // one is kept, and one is not enough
     Query outer(database, "SELECT id FROM item");
     while (outer.step()) {
         Query inner(database, "SELECT id FROM item");
@@ -93,6 +93,29 @@ TEST_F(AccessTest, QueriesOfOneTextMayBeNested) {
         }
     }
     EXPECT_EQ(pairs, 9);
+}
+
+TEST_F(AccessTest, ARelativeNameIsAFileOfTheWorkingDirectory) {
+    std::filesystem::path const before = std::filesystem::current_path();
+    std::filesystem::current_path(directory_);
+    {
+        Database made(":memory:", kind(), Mode::Create);
+        made.query("INSERT INTO item (text) VALUES ('x')").run();
+        EXPECT_EQ(countItems(made), 1);
+        std::filesystem::create_directory("taken.db");
+        auto const error = errorOf([] { Database(std::string("taken.db"), kind(), Mode::Create); });
+        ASSERT_TRUE(error);
+        EXPECT_EQ(error->sentence(), "the test file 'taken.db' cannot be opened: Is a directory");
+    }
+    std::filesystem::current_path(before);
+    EXPECT_TRUE(exists(at(":memory:")));
+}
+
+TEST_F(AccessTest, ADirectoryThatIsMissingIsNotCalledReadOnly) {
+    auto const error = errorOf([&] { Database(at("none/a.db"), kind(), Mode::Create); });
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::Missing);
+    EXPECT_EQ(error->sentence(), "the test file '" + at("none/a.db") + "' cannot be opened: No such file or directory");
 }
 
 TEST_F(AccessTest, ACachedStatementForgetsItsBindings) {

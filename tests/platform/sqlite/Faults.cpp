@@ -8,6 +8,7 @@
 #include <filesystem>
 
 #include <sqlite3.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -19,6 +20,28 @@ using Sqlite::Database;
 using Sqlite::ErrorKind;
 using Sqlite::Mode;
 using Sqlite::Transaction;
+
+/// While it lasts, this process can open nothing more.
+class NoDescriptors {
+public:
+    NoDescriptors() {
+        ::getrlimit(RLIMIT_NOFILE, &before_);
+        rlimit none = before_;
+        int const next = ::dup(0);
+        none.rlim_cur = static_cast<rlim_t>(next);
+        ::close(next);
+        ::setrlimit(RLIMIT_NOFILE, &none);
+    }
+    ~NoDescriptors() {
+        end();
+    }
+    void end() {
+        ::setrlimit(RLIMIT_NOFILE, &before_);
+    }
+
+private:
+    rlimit before_{};
+};
 
 class FaultTest : public SqliteTest {
 protected:
@@ -60,6 +83,23 @@ TEST_F(FaultTest, fault_48_ACutFileIsNamed) {
     });
     ASSERT_TRUE(error);
     EXPECT_EQ(error->kind(), ErrorKind::Malformed) << error->sentence();
+}
+
+TEST_F(FaultTest, fault_62_WithoutADescriptorAFileCannotBeOpenedOrWritten) {
+    makeFile("a.db");
+    Database database(at("a.db"), kind(), Mode::ReadWrite);
+    NoDescriptors none;
+    auto const opened = errorOf([&] { Database(at("a.db"), kind(), Mode::ReadWrite); });
+    auto const written = errorOf([&] { database.query("INSERT INTO item (text) VALUES ('x')").run(); });
+    none.end();
+    ASSERT_TRUE(opened && written);
+    EXPECT_EQ(opened->kind(), ErrorKind::Io);
+    EXPECT_EQ(opened->sentence(), "the test file '" + at("a.db") + "' cannot be opened: unable to open database file");
+    EXPECT_EQ(written->kind(), ErrorKind::Io);
+    EXPECT_EQ(written->sentence(), "the test file '" + at("a.db") + "' cannot be written: its journal cannot be made");
+    EXPECT_EQ(countItems(database), 1);
+    database.query("INSERT INTO item (text) VALUES ('x')").run();
+    EXPECT_EQ(countItems(database), 2);
 }
 
 TEST_F(FaultTest, fault_48_AnIntegrityCheckFindsWhatNobodyReadYet) {
@@ -175,7 +215,6 @@ TEST_F(FaultTest, fault_50_AReadOnlyFileStillReads) {
         EXPECT_NO_THROW({
             Database database(at("a.db"), kind(), mode);
             EXPECT_EQ(countItems(database), 2);
-            EXPECT_TRUE(database.isReadOnly());
             error = errorOf([&] { database.query("DELETE FROM item").run(); });
         });
         ASSERT_TRUE(error);

@@ -59,8 +59,6 @@ public:
     std::string const &path() const noexcept;
     /// Whether the path no longer leads to the file that is open.
     bool hasMoved() const;
-    /// Whether nothing can be changed: a read-only file system, or no permission to write.
-    bool isReadOnly() const;
     /// Changes when somebody else has committed to the file since the last call.
     int64_t dataVersion();
     /// Reads the whole file and throws FileMalformed, naming the first damage.

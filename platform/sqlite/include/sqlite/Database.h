@@ -81,8 +81,6 @@ public:
     int64_t dataVersion();
     /// Whether the path no longer leads to the file that is open (removed, or replaced by another).
     bool hasMoved() const;
-    /// Whether the file can only be read (QueryOnly, a read-only file system, missing permission).
-    bool isReadOnly() const;
     /// Reads the whole file; throws ErrorKind::Malformed naming the first damage. Takes time in proportion to its size.
     void checkIntegrity();
 

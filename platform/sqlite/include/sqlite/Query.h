@@ -22,10 +22,8 @@ class Query {
 public:
     Query(Database &database, std::string_view sql);
     ~Query();
-    Query(Query &&other) noexcept;
     Query(Query const &) = delete;
     Query &operator=(Query const &) = delete;
-    Query &operator=(Query &&) = delete;
 
     Query &bind(int parameter, int64_t value);
     /// Copies the text.
