@@ -1,11 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // From a Topology to an array file that is there whole or not at all.
+#include <algorithm>
 #include <cerrno>
 #include <filesystem>
 #include <memory>
 #include <string_view>
 #include <system_error>
+#include <utility>
 
 #include <fcntl.h>
 #include <sys/file.h>
@@ -25,16 +27,17 @@ namespace Orka {
 
 namespace {
 
+constexpr std::pair<int, Wire::ErrorCode> codes[] = {
+    {ENOENT, Wire::ErrorCode::FileMissing}, {ENOTDIR, Wire::ErrorCode::FileMissing},
+    {ENOSPC, Wire::ErrorCode::DiskFull},    {EDQUOT, Wire::ErrorCode::DiskFull},
+    {EROFS, Wire::ErrorCode::FileReadOnly}, {EACCES, Wire::ErrorCode::FileReadOnly},
+    {EPERM, Wire::ErrorCode::FileReadOnly},
+};
+
 [[noreturn]] void failMaking(std::string const &path, int error) {
-    auto code = Wire::ErrorCode::IoError;
-    if (error == ENOENT || error == ENOTDIR) {
-        code = Wire::ErrorCode::FileMissing;
-    } else if (error == ENOSPC || error == EDQUOT) {
-        code = Wire::ErrorCode::DiskFull;
-    } else if (error == EROFS || error == EACCES || error == EPERM) {
-        code = Wire::ErrorCode::FileReadOnly;
-    }
-    throw Wire::Failure(code,
+    auto const *const known =
+        std::find_if(std::begin(codes), std::end(codes), [=](auto const &code) { return code.first == error; });
+    throw Wire::Failure(known != std::end(codes) ? known->second : Wire::ErrorCode::IoError,
                         "the array file '" + path + "' cannot be made: " + std::generic_category().message(error));
 }
 
@@ -124,7 +127,7 @@ private:
 void syncDirectoryOf(std::string const &path) {
     int const file = open(directoryOf(path).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     if (file < 0) {
-        failMaking(path, errno);
+        return; // It can be entered, not read: the file is there, and its file system's own order has to do.
     }
     int const error = fsync(file) == 0 ? 0 : errno;
     close(file);

@@ -1,8 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Fixture.h"
 
+#include <algorithm>
 #include <filesystem>
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
 #include <unistd.h>
+
+#include "wire/UniqueFd.h"
 
 using namespace Orka;
 
@@ -95,6 +102,61 @@ TEST_F(MakingAnArrayFile, tellsWhyAFileCannotBeMade) {
     std::filesystem::create_directory(at("directory"));
     EXPECT_NE(codeOf([&] { makeArrayFile(other(), at("directory"), Replace::ArrayFile); }), Wire::ErrorCode::Success);
     EXPECT_TRUE(std::filesystem::is_directory(at("directory")));
+}
+
+TEST_F(MakingAnArrayFile, takesAwayAbandonedDraftsAndNothingElse) {
+    std::string const uuid = "10000000-0000-4000-8000-000000000001";
+    std::vector<std::string> const kept = {
+        "Test.array." + uuid + ".new",                         // of another file
+        "test.array-" + uuid + ".new",                         // all but a dot
+        "test.array." + uuid + ".old",                         // another ending
+        "test.array.10000000-0000-4000-8000-00000000000x.new", // no id
+        "test.array.20000000-0000-4000-8000-000000000002.new", // a file
+        "test.array.30000000-0000-4000-8000-000000000003.new", // held by its maker
+    };
+    for (std::size_t number = 0; number < kept.size(); ++number) {
+        if (number == 4) {
+            writeBytes(at(kept[number]), "x");
+        } else {
+            std::filesystem::create_directory(at(kept[number]));
+        }
+    }
+    Wire::UniqueFd const maker(::open(at(kept.back()).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    ASSERT_EQ(::flock(maker.get(), LOCK_EX | LOCK_NB), 0);
+    auto const abandoned = at("test.array." + uuid + ".new");
+    std::filesystem::create_directory(abandoned);
+    writeBytes(abandoned + "/array", "half");
+    makeArray();
+    EXPECT_FALSE(std::filesystem::exists(abandoned));
+    std::vector<std::string> expected = kept;
+    expected.push_back("test.array");
+    std::sort(expected.begin(), expected.end());
+    EXPECT_EQ(filesInDirectory(), expected);
+}
+
+TEST_F(MakingAnArrayFile, needsNoRightToReadItsDirectory) {
+    std::filesystem::create_directory(at("open"));
+    std::filesystem::create_directory(at("closed"));
+    ASSERT_EQ(::chmod(directory_.c_str(), 0711), 0);
+    ASSERT_EQ(::chmod(at("open").c_str(), 0333), 0); // to be entered and written, not read
+    ASSERT_EQ(::chmod(at("closed").c_str(), 0555), 0);
+    // Root may do everything; become somebody else for a while.
+    bool const root = ::geteuid() == 0;
+    ASSERT_TRUE(!root || ::seteuid(65534) == 0);
+    auto const first = failureOf([&] { makeArrayFile(other(), at("open/x.array"), Replace::Never); });
+    auto const second = failureOf([&] { makeArrayFile(other(), at("closed/x.array"), Replace::Never); });
+    ASSERT_TRUE(!root || ::seteuid(0) == 0);
+    EXPECT_EQ(first, "");
+    EXPECT_EQ(second, "the array file '" + at("closed/x.array") + "' cannot be made: Permission denied");
+    ASSERT_EQ(::chmod(at("open").c_str(), 0755), 0);
+    EXPECT_EQ(ArrayFile(at("open/x.array")).inventory().arrays[0].id, "other");
+}
+
+TEST_F(MakingAnArrayFile, saysWhatTheSystemSaidOfANameThatIsTooLong) {
+    auto const path = at(std::string(250, 'x'));
+    EXPECT_EQ(failureOf([&] { makeArrayFile(other(), path, Replace::Never); }),
+              "the array file '" + path + "' cannot be made: File name too long");
+    EXPECT_EQ(codeOf([&] { makeArrayFile(other(), path, Replace::Never); }), Wire::ErrorCode::IoError);
 }
 
 TEST_F(MakingAnArrayFile, readsEverySampleTopology) {

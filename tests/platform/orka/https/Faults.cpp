@@ -125,6 +125,14 @@ TEST_F(ProviderFaultTest, fault_39_whatIsJsonAndNotTheAnswerIsNamedByItsPath) {
                       what);
         EXPECT_EQ(code_, ErrorCode::ProtocolError);
     }
+    serveText(200, R"({"blockSize": 512, "bitmap": "no base64"})");
+    EXPECT_EQ(sentence(newClient()->unsharedChunksVirtualVolume(context(), goldId, webId)),
+              "the provider at array.test:8443 gave an answer that is not what it should be: "
+              "unsharedChunksVirtualVolume: bitmap: base64 is expected");
+    serveText(200, R"({"entries": {}})");
+    EXPECT_EQ(sentence(newClient()->getMetadata(context(), goldId, webId)),
+              "the provider at array.test:8443 gave an answer that is not what it should be: "
+              "getMetadata: entries: a list is expected, not an object");
     serveText(200, R"({"version": "1", "unchanged": true, "items": []})");
     EXPECT_EQ(sentence(newClient()->queryStorageContainer(context())),
               "the provider at array.test:8443 answered queryStorageContainer that nothing has changed, of a version "
