@@ -95,6 +95,16 @@ TEST_F(AccessibilityTest, WhatNobodyCanBeAskedAboutIsUnconfirmed) {
     EXPECT_THAT(accessibility({bound_, "unknown"}), ElementsAre(unconfirmed, unconfirmed));
 }
 
+TEST_F(AccessibilityTest, AnAnswerAboutFewerVolumesIsNone) {
+    vendor_->swallowsAnswers = true;
+    EXPECT_THAT(accessibility({bound_, "unknown"}), ElementsAre(unconfirmed, unconfirmed));
+}
+
+TEST_F(AccessibilityTest, AProviderThatNoLongerKnowsTheContainerDeniesItsVolumes) {
+    vendor_->failing.emplace("queryVirtualVolumesById", Wire::Failure(ErrorCode::NoSuchContainer, "it went"));
+    EXPECT_THAT(accessibility({bound_, "unknown"}), ElementsAre(nonExistent, nonExistent));
+}
+
 TEST_F(AccessibilityTest, VolumesOfAnOfflineProviderAreUnconfirmed) {
     inject("vp", "offline");
     EXPECT_THAT(accessibility({bound_, unbound_}), ElementsAre(unconfirmed, unconfirmed));
@@ -143,6 +153,15 @@ TEST_F(AccessibilityTest, AnEventTellsTheContainersOfTheEndpoint) {
     vendor_->containers.push_back(containerOf(3, "bronze", {"a2"}));
     EXPECT_THAT(names(event("e1", true)), ElementsAre("gold", "silver"));
     EXPECT_THAT(names(event("e3", false)), ElementsAre("silver", "bronze"));
+}
+
+TEST_F(AccessibilityTest, AnEventThatASilentProviderMayKnowOfFailsWithThat) {
+    auto const other = addVendor("other");
+    other->failing.emplace("queryStorageArray", Wire::Failure(ErrorCode::ProviderUnreachable, "the wire is cut"));
+    EXPECT_EQ(event("e1", true).code(), ErrorCode::Success);
+    Reply const unknown = event("e9", true);
+    EXPECT_EQ(unknown.code(), ErrorCode::ProviderUnreachable);
+    EXPECT_EQ(unknown.sentence(), "the wire is cut");
 }
 
 TEST_F(AccessibilityTest, AnEventOfAnUnknownEndpointIsRefused) {

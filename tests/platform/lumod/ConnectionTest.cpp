@@ -158,6 +158,21 @@ TEST_F(ConnectionTest, fault_23_APeerThatLeavesInMidReplyHurtsNobody) {
     EXPECT_EQ(ask(client, framed(ping)).which, Wire::Reply::PONG);
 }
 
+TEST_F(ConnectionTest, fault_23_APeerThatLeavesInMidRequestHurtsNobody) {
+    std::string const request = framed(ping);
+    for (std::size_t const cut : {std::size_t{3}, std::size_t{8}, request.size() - 1}) {
+        RawClient leaver(orderedPath());
+        leaver.send(request.substr(0, cut));
+        turn();
+        EXPECT_EQ(server_->connections(), 1U);
+        leaver.close();
+        turn();
+        EXPECT_EQ(server_->connections(), 0U) << cut;
+    }
+    RawClient client(orderedPath());
+    EXPECT_EQ(ask(client, framed(ping)).which, Wire::Reply::PONG);
+}
+
 TEST_F(ConnectionTest, APeerThatDoesNotReadCostsOneMessageAndEndsAtTheDeadline) {
     auto const vendor = addUsualVendor();
     vendor->containers.clear();

@@ -153,6 +153,26 @@ TEST_F(ProviderStateTest, InjectedArrayFlagsHideTheRecordsOnes) {
     EXPECT_THAT(containers(), ElementsAre("gold@fake:one[a1]")) << "default without arrays takes the flags back";
 }
 
+TEST_F(ProviderStateTest, NobodyIsTakenOverFromWhereNobodyIsActive) {
+    addTwins(9, 1);
+    inject("one", "default", {{"a1", false}});
+    inject("two", "default", {{"a1", false}});
+    Reply const refused = activate("one", "a1", "fake:two");
+    EXPECT_EQ(refused.code(), ErrorCode::NotTheActiveProvider);
+    EXPECT_EQ(refused.sentence(), "no provider is active for the storage array a1, so fake:two is not");
+}
+
+TEST_F(ProviderStateTest, AnInjectionNeedsNoUrl) {
+    addTwins(9, 1);
+    Reply const injected = ask([](Wire::Request::Builder request) {
+        auto injection = request.initVendorProviderInjectFault();
+        injection.setProviderName("one");
+        injection.setStatus("offline");
+    });
+    EXPECT_TRUE(injected.only().isDone());
+    EXPECT_THAT(containers(), ElementsAre("gold@fake:two[a1]"));
+}
+
 TEST_F(ProviderStateTest, AStatusAloneKeepsTheFlags) {
     addTwins(9, 1);
     inject("one", "default", {{"a1", false}});

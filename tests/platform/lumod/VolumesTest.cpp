@@ -123,6 +123,18 @@ TEST_F(VolumesTest, WithoutAnAccessibleEndpointNothingIsChanged) {
     EXPECT_EQ(boundTo(uuid), "e1");
 }
 
+TEST_F(VolumesTest, EndpointsThatWentMeanwhileAreTriedToTheLast) {
+    std::string const uuid = vendor_->addVolume(containerIdOf(1), "vm");
+    vendor_->failing.emplace("bindVirtualVolume", Wire::Failure(ErrorCode::NoAccessibleEndpoint, "it went"));
+    Reply const reply = volumeRequest("bind", uuid);
+    EXPECT_EQ(reply.code(), ErrorCode::NoAccessibleEndpoint);
+    EXPECT_EQ(reply.sentence(), "the virtual volume " + uuid +
+                                    " cannot be bound: no protocol endpoint of the storage container " +
+                                    containerIdOf(1) + " is accessible");
+    EXPECT_EQ(vendor_->count("bindVirtualVolume " + uuid + " e1"), 1);
+    EXPECT_EQ(vendor_->count("bindVirtualVolume " + uuid + " e2"), 1);
+}
+
 TEST_F(VolumesTest, AVolumeIsNamedByDirectoryNameToo) {
     std::string const uuid = vendor_->addVolume(containerIdOf(1), "vm");
     EXPECT_STREQ(volumeRequest("bind", "", "vm").only().getVolume().getUuid().cStr(), uuid.c_str());
