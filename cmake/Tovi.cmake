@@ -34,9 +34,9 @@ endif()
 
 if(TOVI_COVERAGE)
   # One file a binary, which is the memory that its processes count in (%c): what a process does that is killed, or that
-  # leaves by _exit, is counted too.
+  # leaves by _exit, is counted too. What several add to at once has to be added atomically.
   set(profiles "${CMAKE_BINARY_DIR}/profiles/%c%m.profraw")
-  add_compile_options(-fprofile-instr-generate=${profiles} -fcoverage-mapping "SHELL:-mllvm -runtime-counter-relocation")
+  add_compile_options(-fprofile-instr-generate=${profiles} -fcoverage-mapping -fprofile-update=atomic "SHELL:-mllvm -runtime-counter-relocation")
   add_link_options(-fprofile-instr-generate=${profiles})
 endif()
 
