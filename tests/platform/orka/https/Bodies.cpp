@@ -24,7 +24,7 @@ TEST(Slice, endsByCountBySizeOrWithItsList) {
     EXPECT_EQ(slice(5, 10, 1000), 0U);
     EXPECT_EQ(slice(0, 2, 1000), 2U);
     EXPECT_EQ(slice(0, 10, 1), 1U) << "one, however long";
-    EXPECT_EQ(slice(0, 10, 40), 2U);
+    EXPECT_EQ(slice(0, 10, 60), 2U);
 }
 
 } // namespace

@@ -129,10 +129,10 @@ TEST_F(ProviderFaultTest, fault_39_whatIsJsonAndNotTheAnswerIsNamedByItsPath) {
     EXPECT_EQ(sentence(newClient()->unsharedChunksVirtualVolume(context(), goldId, webId)),
               "the provider at array.test:8443 gave an answer that is not what it should be: "
               "unsharedChunksVirtualVolume: bitmap: base64 is expected");
-    serveText(200, R"({"entries": {}})");
+    serveText(200, R"({"items": {}})");
     EXPECT_EQ(sentence(newClient()->getMetadata(context(), goldId, webId)),
               "the provider at array.test:8443 gave an answer that is not what it should be: "
-              "getMetadata: entries: a list is expected, not an object");
+              "getMetadata: items: a list is expected, not an object");
     serveText(200, R"({"version": "1", "unchanged": true, "items": []})");
     EXPECT_EQ(sentence(newClient()->queryStorageContainer(context())),
               "the provider at array.test:8443 answered queryStorageContainer that nothing has changed, of a version "
