@@ -87,7 +87,7 @@ std::string didYouMean(std::vector<std::string> const &names) {
     std::string text;
     for (std::size_t i = 0; i < names.size(); ++i) {
         text += i == 0 ? "; did you mean " : (i + 1 == names.size() ? " or " : ", ");
-        text += "'" + names[i] + "'";
+        text += shownWord(names[i]);
     }
     return text.empty() ? text : text + "?";
 }

@@ -32,7 +32,7 @@ std::vector<std::string> splitNames(std::string const &names) {
 std::string joined(std::vector<std::string> const &names) {
     std::string text;
     for (std::string const &name : names) {
-        text += (text.empty() ? "'" : ", '") + name + "'";
+        text += (text.empty() ? "" : ", ") + shownWord(name);
     }
     return text;
 }

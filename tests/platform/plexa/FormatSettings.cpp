@@ -75,6 +75,8 @@ TEST(FormatSettings, ChosenFieldsMustBeDeclared) {
               "--fields: 'Nmae' is no field of the result; did you mean 'Name'?; there is 'Name', 'Size'");
     EXPECT_EQ(mistakeOf([&] { made.chooseFields("S", "a, b,a", {"a", "b"}); }), "--fields: 'a' is named twice");
     EXPECT_EQ(mistakeOf([&] { made.chooseFields("S", " , ", {"a"}); }), "--fields: no name given; there is 'a'");
+    EXPECT_EQ(mistakeOf([&] { made.chooseFields("S", "b", {"b\x1b"}); }),
+              "--fields: 'b' is no field of the result; did you mean 'b\\x1b'?; there is 'b\\x1b'");
     EXPECT_EQ(mistakeOf([&] { made.chooseFields("", "a", {}); }), "--fields: the result of this command has no fields");
     made.chooseFields("S", "b", {"a", "b"});
     EXPECT_EQ(made.fields("S"), (std::vector<std::string>{"b"}));
