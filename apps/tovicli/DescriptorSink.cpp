@@ -3,6 +3,7 @@
 
 #include <cerrno>
 #include <cstring>
+#include <fcntl.h>
 #include <poll.h>
 #include <unistd.h>
 
@@ -15,6 +16,7 @@ void DescriptorSink::write(std::string_view text) {
     while (!text.empty() && error_ == 0) {
         ssize_t const written = ::write(descriptor_, text.data(), text.size());
         if (written >= 0) {
+            hasWritten_ = true;
             text.remove_prefix(static_cast<std::size_t>(written));
         } else if (errno == EAGAIN) {
             // Somebody else made the terminal or pipe non-blocking: wait until it takes more.
@@ -27,7 +29,15 @@ void DescriptorSink::write(std::string_view text) {
 }
 
 std::string DescriptorSink::problem() const {
-    return error_ == 0 ? std::string() : std::string(std::strerror(error_));
+    int error = error_;
+    if (error == 0 && hasWritten_) {
+        // A file system that writes later tells what came of it when a descriptor is closed; any will do.
+        int const duplicate = fcntl(descriptor_, F_DUPFD_CLOEXEC, 0);
+        if (duplicate >= 0 && close(duplicate) != 0) {
+            error = errno;
+        }
+    }
+    return error == 0 || error == EINTR ? std::string() : std::string(std::strerror(error));
 }
 
 } // namespace Tovicli

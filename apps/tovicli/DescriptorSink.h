@@ -5,7 +5,8 @@
 
 namespace Tovicli {
 
-/// Writes to a descriptor at once and remembers the first error.
+/// Writes to a descriptor at once and remembers the first error. Asked for problems, it also asks a file system that
+/// writes later (a network's, one with quotas).
 class DescriptorSink : public Plexa::Sink {
 public:
     /// @param descriptor stays the caller's
@@ -16,6 +17,7 @@ public:
 private:
     int descriptor_;
     int error_ = 0;
+    bool hasWritten_ = false;
 };
 
 } // namespace Tovicli

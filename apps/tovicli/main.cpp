@@ -78,12 +78,6 @@ std::string randomRequestId() {
     return id;
 }
 
-std::size_t terminalWidth() {
-    winsize size{};
-    bool const isTerminal = ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0;
-    return isTerminal && size.ws_col > 0 ? size.ws_col : 80;
-}
-
 Plexa::Display outputDisplay(Tovicli::Environment const &environment) {
     winsize size{};
     bool const isTerminal = ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0;
@@ -106,17 +100,18 @@ int main(int argc, char **argv) {
     Plexa::Sink &errors = completing ? static_cast<Plexa::Sink &>(untold) : told;
     Tovicli::ProcessEnvironment environment;
     Tovicli::PluginLoader plugins(installed + "/lib", geteuid());
+    Plexa::Display const display = outputDisplay(environment);
     Tovicli::Context context{output,
                              errors,
                              environment,
                              plugins,
                              randomRequestId,
                              {installed + "/lib/tovicli/plugins", workingDirectory()},
-                             terminalWidth(),
+                             display.width > 0 ? display.width : 80, // help always has a width
                              getauxval(AT_SECURE) != 0,
                              &activity,
                              {},
                              Tovicli::cliLibrary(installed + "/lib/tovicli/libtovicli-cli.so")};
-    context.display = outputDisplay(environment);
+    context.display = display;
     return static_cast<int>(Tovicli::Tool(context).run(std::vector<std::string>(argv, argv + argc)));
 }

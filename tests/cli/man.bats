@@ -38,6 +38,14 @@ quiet() {
     [[ "$output" == *'"tovicli-storage-internal-lumo-orkaprovider-add - Add a new Orka Provider on the host"' ]]
 }
 
+@test "COLUMNS counts before the terminal's width" {
+    host_without_daemon
+    terminal_run -w 120 -e COLUMNS=60 -e TOVI_OFFLINE=1 -- tovicli storage internal lumo orkaprovider set --help
+    expect_status 0
+    longest="$(wc -L <"$screen")"
+    [ "$longest" -le 60 ] && [ "$longest" -gt 40 ] || mismatch "lines of 41 to 60 columns, not $longest: $(cat "$screen")"
+}
+
 @test "help is wrapped to the terminal's width" {
     host_without_daemon
     for width in 60 100; do
