@@ -132,6 +132,9 @@ TEST_F(AccessibilityTest, VolumesAreFoundOnWhicheverProviderHasThem) {
     EXPECT_THAT(accessibility({theirs, bound_, "unknown"}), ElementsAre(accessible, accessible, nonExistent));
     other->failing.emplace("queryVirtualVolumesById", Wire::Failure(ErrorCode::ProviderUnreachable, "cut"));
     EXPECT_THAT(accessibility({theirs, bound_, "unknown"}), ElementsAre(unconfirmed, accessible, unconfirmed));
+    other->failing.clear();
+    vendor_->failing.emplace("queryVirtualVolumesById", Wire::Failure(ErrorCode::ProviderUnreachable, "cut"));
+    EXPECT_THAT(accessibility({theirs, bound_, "unknown"}), ElementsAre(accessible, unconfirmed, unconfirmed));
 }
 
 TEST_F(AccessibilityTest, NoIdsAreNoAnswers) {
