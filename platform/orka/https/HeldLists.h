@@ -65,15 +65,15 @@ private:
     template <typename T>
     std::shared_ptr<Content const> same(std::shared_ptr<std::vector<T> const> const &items) const {
         Content const *compared = nullptr;
-        for (auto list = lists_.rbegin(); list != lists_.rend(); ++list) {
+        for (List const &list : lists_) {
             // Neighbours mostly share theirs, and need no second look.
-            if (list->content.get() == compared) {
+            if (list.content.get() == compared) {
                 continue;
             }
-            compared = list->content.get();
+            compared = list.content.get();
             if (compared->type == typeid(T) && compared->elements == items->size() &&
                 (compared->items == items || *static_cast<std::vector<T> const *>(compared->items.get()) == *items)) {
-                return list->content;
+                return list.content;
             }
         }
         return nullptr;

@@ -12,8 +12,6 @@ namespace Plexa {
 
 namespace {
 
-using CallSpec::ParameterSpec;
-
 int64_t toNumber(std::string const &option, std::string const &value) {
     int64_t number = 0;
     char const *const end = value.data() + value.size();

@@ -40,7 +40,7 @@ inline std::span<std::uint8_t const> readBytes(Segment const &segment, Word cons
 inline std::string_view readText(Segment const &segment, Word const *place) {
     Pointer const pointer(loaded<Word>(place));
     if (pointer.isNull()) {
-        return std::string_view("", 0);
+        return "";
     }
     std::span<std::uint8_t const> const bytes = readBytes(segment, place, pointer);
     if (bytes.empty() || bytes.back() != 0) {
@@ -141,7 +141,7 @@ protected:
         return place < pointerCount_ && loaded<Word>(pointerAt(place)) != 0;
     }
     std::string_view text(std::uint32_t place) const {
-        return place < pointerCount_ ? readText(*segment_, pointerAt(place)) : std::string_view("", 0);
+        return place < pointerCount_ ? readText(*segment_, pointerAt(place)) : std::string_view("");
     }
     std::span<std::uint8_t const> data(std::uint32_t place) const {
         if (!hasPointer(place)) {
