@@ -14,11 +14,10 @@ class VersionStandsStill final : public Forwarding {
 public:
     using Forwarding::Forwarding;
     Answer<Listing<StorageContainer>> queryStorageContainer(CallContext context) override {
-        bool const odd = ++asked_ % 2 == 0;
         return changed(Forwarding::queryStorageContainer(std::move(context)),
-                       [odd](Listing<StorageContainer> &listing) {
+                       [times = ++asked_](Listing<StorageContainer> &listing) {
                            auto items = *listing.items;
-                           if (odd && !items.empty()) {
+                           if (times % 2 == 0 && !items.empty()) {
                                items.back().name += " (renamed)";
                            }
                            listing.items = std::make_shared<std::vector<StorageContainer> const>(std::move(items));
