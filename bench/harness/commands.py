@@ -21,7 +21,7 @@ def start(suite):
         for name, goal, limit, words in (
             ("start --version", 1.2, 1.5, ["tovicli", "--version"]),
             ("start daemon set", 1.6, 2.0, ["tovicli", *SUBTREE, "daemon", "set", "--log-level", "info"]),
-            ("start load, nothing to do", 1.6, 2.0, ["tovicli", *SUBTREE, "storagecontainer", "load"]),
+            ("start load, nothing to do", 1.6, 2.5, ["tovicli", *SUBTREE, "storagecontainer", "load"]),
         ):
             if suite.wanted(name):
                 command = [suite.build.program("bench_pair"), str(rounds), *words, "--", suite.build.program("bench_nothing")]

@@ -62,14 +62,15 @@ class Report:
         self.line(name, median(values), low, high, goal, limit, detail, unit)
 
     def growth(self, name, times, limit, floors=None):
-        """Times by size, in the sizes' order: how much longer each size took than the one before it. What the floor took grew as
-        well, which is told."""
+        """Times by size, in the sizes' order: how much longer each size took than the one before it. Where the floor grew more
+        than the limit, as it does when a cache no longer holds everything, a tenth more than the floor is the limit."""
         times = list(times)
         for (small, small_times), (large, large_times) in zip(times, times[1:]):
-            told = f"; the floor grew {median(floors[large]) / median(floors[small]):.2f} times" if floors else ""
+            floor = median(floors[large]) / median(floors[small]) if floors else 0
+            told = f"; the floor grew {floor:.2f} times" if floors else ""
             base = median(small_times)
             low, high = quartiles(large_times)
-            self.line(f"{name}: {small} to {large}", median(large_times) / base, low / base, high / base, limit, limit,
+            self.line(f"{name}: {small} to {large}", median(large_times) / base, low / base, high / base, limit, max(limit, round(1.1 * floor, 1)),
                       f"{large / small:g} times as many{told}")
 
     def point(self, plot, line, size, nanoseconds):

@@ -61,6 +61,14 @@ class Arithmetic(unittest.TestCase):
         made.growth("g", {10: [4], 100: [40]}.items(), 10.5, {10: [2, 3, 4], 100: [36, 36, 36]})
         self.assertEqual(made.rows[0]["detail"], "10 times as many; the floor grew 12.00 times")
 
+    def test_growth_may_be_a_tenth_more_than_the_floors(self):
+        made = Report(lambda _: None)
+        made.growth("g", {10: [1], 100: [13]}.items(), 10.5, {10: [1], 100: [12]})
+        self.assertEqual((made.rows[0]["goal"], made.rows[0]["limit"]), (10.5, 13.2))
+        self.assertEqual(verdict(made.rows[0]), "past the goal")
+        made.growth("g", {10: [1], 100: [13.3]}.items(), 10.5, {10: [1], 100: [12]})
+        self.assertTrue(made.is_over)
+
     def test_a_median_at_its_bounds_is_within_them(self):
         for value, expected in ((2.0, "within the goal"), (2.01, "past the goal"), (3.0, "past the goal"), (3.01, "PAST THE LIMIT")):
             made = report(("r", value))
