@@ -105,14 +105,18 @@ Descriptor openFile(Descriptor const &directory, std::string const &name, uid_t 
 
 } // namespace
 
-PluginDirectory openPluginDirectory(std::string const &path, uid_t user) {
-    PluginDirectory opened;
+Descriptor openTrustedDirectory(std::string const &path, uid_t user, std::string &problem) {
     std::unique_ptr<char, decltype(&std::free)> const canonical(realpath(path.c_str(), nullptr), &std::free);
     if (canonical == nullptr) {
-        opened.problem = systemText(errno);
-        return opened;
+        problem = systemText(errno);
+        return Descriptor();
     }
-    Descriptor const directory = openChecked(canonical.get(), user, opened.problem);
+    return openChecked(canonical.get(), user, problem);
+}
+
+PluginDirectory openPluginDirectory(std::string const &path, uid_t user) {
+    PluginDirectory opened;
+    Descriptor const directory = openTrustedDirectory(path, user, opened.problem);
     if (!directory.isOpen()) {
         return opened;
     }

@@ -31,4 +31,9 @@ struct PluginDirectory {
 /// @param user who may own plug-ins besides root
 PluginDirectory openPluginDirectory(std::string const &path, uid_t user);
 
+/// The directory alone, by the same rules. What is opened from its descriptor is what its owner has put there, whatever
+/// becomes of the links and names that led to it.
+/// @param problem why it is not used, when what is returned is not open
+Descriptor openTrustedDirectory(std::string const &path, uid_t user, std::string &problem);
+
 } // namespace Tovicli

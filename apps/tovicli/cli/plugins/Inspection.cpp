@@ -30,24 +30,31 @@ std::string directoryOf(std::string const &path) {
     return slash == std::string::npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
 }
 
+/// Where a file is looked for.
+struct Place {
+    int directory;
+    std::string name;
+};
+
 /// Rules for the file itself: there, of the right name, regular, nobody else's.
-void checkEntry(std::string const &file, std::vector<Finding> &findings) {
-    std::string const name = nameOf(file);
+/// @return whether it is a file at all
+bool checkEntry(Place const &place, std::vector<Finding> &findings) {
+    std::string const name = nameOf(place.name);
     if (name.size() <= 3 || !name.ends_with(".so")) {
         findings.push_back({"file", "its name does not end in .so; nothing else of a plug-in directory is looked at"});
     }
     struct stat status {};
-    if (lstat(file.c_str(), &status) != 0) {
+    if (fstatat(place.directory, place.name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
         findings.push_back({"file", std::strerror(errno)});
-        return;
+        return false;
     }
     if (S_ISLNK(status.st_mode)) {
         findings.push_back({"file", "it is a symbolic link"});
-        return;
+        return false;
     }
     if (!S_ISREG(status.st_mode)) {
         findings.push_back({"file", "it is no regular file"});
-        return;
+        return false;
     }
     if (status.st_uid != 0 && status.st_uid != geteuid()) {
         findings.push_back({"permissions", "it belongs to neither root nor the user"});
@@ -55,12 +62,10 @@ void checkEntry(std::string const &file, std::vector<Finding> &findings) {
     if ((status.st_mode & (S_IWGRP | S_IWOTH)) != 0) {
         findings.push_back({"permissions", "it can be written by others"});
     }
-    if (access(file.c_str(), R_OK) != 0) {
+    if (faccessat(place.directory, place.name.c_str(), R_OK, 0) != 0) {
         findings.push_back({"permissions", "it cannot be read: " + std::string(std::strerror(errno))});
     }
-    if (std::string const problem = openPluginDirectory(directoryOf(file), geteuid()).problem; !problem.empty()) {
-        findings.push_back({"permissions", "its directory: " + problem});
-    }
+    return true;
 }
 
 /// Rules for what the file says of itself. @return what it needs; nothing when it cannot be read that far
@@ -96,17 +101,27 @@ std::string abiOf(std::string const &file) {
     return abi;
 }
 
-std::vector<Finding> inspectFile(std::string const &file) {
-    std::vector<Finding> findings;
-    checkEntry(file, findings);
-    Descriptor const opened(open(file.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
-    struct stat status {};
-    if (!opened.isOpen() || fstat(opened.number(), &status) != 0 || !S_ISREG(status.st_mode)) {
-        return findings;
+Inspected inspectFile(std::string const &file) {
+    Inspected inspected;
+    std::vector<Finding> &findings = inspected.findings;
+    std::string directoryProblem;
+    Descriptor const directory = openTrustedDirectory(directoryOf(file), geteuid(), directoryProblem);
+    // A file of a directory that is not trusted is looked at all the same, by its path: it is never loaded.
+    Place const place = directory.isOpen() ? Place{directory.number(), nameOf(file)} : Place{AT_FDCWD, file};
+    bool const isFile = checkEntry(place, findings);
+    if (isFile && !directoryProblem.empty()) {
+        findings.push_back({"permissions", "its directory: " + directoryProblem});
     }
-    checkElf(opened.number(), findings);
-    if (readElfFile(opened.number()).problem.empty()) {
-        std::vector<Symbol> const symbols = dynamicSymbols(opened.number());
+    inspected.file = Descriptor(
+        openat(place.directory, place.name.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    int const opened = inspected.file.number();
+    struct stat status {};
+    if (!inspected.file.isOpen() || fstat(opened, &status) != 0 || !S_ISREG(status.st_mode)) {
+        return inspected;
+    }
+    checkElf(opened, findings);
+    if (readElfFile(opened).problem.empty()) {
+        std::vector<Symbol> const symbols = dynamicSymbols(opened);
         bool hasEntry = false;
         for (Symbol const &symbol : symbols) {
             hasEntry = hasEntry || (symbol.defined && symbol.name == "AutoCli_RegisterNamespaces");
@@ -115,12 +130,12 @@ std::vector<Finding> inspectFile(std::string const &file) {
             findings.push_back({"entry point", "it has no entry point AutoCli_RegisterNamespaces"});
         }
     }
-    return findings;
+    return inspected;
 }
 
 std::vector<Finding> inspect(Question const &question) {
-    std::vector<Finding> findings = inspectFile(question.file);
-    return findings.empty() ? tryOut(question) : findings;
+    Inspected inspected = inspectFile(question.file);
+    return inspected.findings.empty() ? tryOut(question, inspected.file) : std::move(inspected.findings);
 }
 
 } // namespace Tovicli::Cli

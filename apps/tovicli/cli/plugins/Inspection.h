@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "Descriptor.h"
 #include "Frame.h"
 
 namespace Tovicli::Cli {
@@ -40,6 +41,13 @@ struct Question {
 std::vector<Finding> inspect(Question const &question);
 
 /// What can be seen without loading anything.
-std::vector<Finding> inspectFile(std::string const &file);
+struct Inspected {
+    std::vector<Finding> findings;
+    /// The file that was looked at. Only this may be loaded, and only when there are no findings: by its path there may
+    /// be another one by now.
+    Descriptor file;
+};
+
+Inspected inspectFile(std::string const &file);
 
 } // namespace Tovicli::Cli

@@ -40,14 +40,9 @@ std::string loaderText() {
     return text != nullptr ? text : "unknown error";
 }
 
-Loaded load(std::string const &file, PlatformLibraries &platform) {
+/// @param descriptor the plug-in's file; stays open, since the system's loader knows libraries by path and inode
+Loaded load(int descriptor, PlatformLibraries &platform) {
     Loaded loaded;
-    Descriptor opened(open(file.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC));
-    if (!opened.isOpen()) {
-        loaded.findings.push_back({"file", std::strerror(errno)});
-        return loaded;
-    }
-    int const descriptor = opened.number();
     if (std::string const problem = platform.provide(readElfFile(descriptor).needed); !problem.empty()) {
         loaded.findings.push_back({"library", problem});
         return loaded;
@@ -68,7 +63,6 @@ Loaded load(std::string const &file, PlatformLibraries &platform) {
     for (std::string const &name : missing) {
         loaded.findings.push_back({"symbol", "nothing that it needs has the symbol " + name});
     }
-    opened.keepForever();
     loaded.entry = reinterpret_cast<EntryPoint>(dlsym(library, "AutoCli_RegisterNamespaces"));
     if (loaded.entry == nullptr) {
         loaded.findings.push_back({"entry point", loaderText()});
@@ -119,9 +113,9 @@ std::vector<Finding> collisions(EntryPoint entry, std::set<std::string> const &o
     return findings;
 }
 
-std::vector<Finding> tried(Question const &question) {
+std::vector<Finding> tried(Question const &question, Descriptor const &file) {
     PlatformLibraries platform(question.libraryDirectory);
-    Loaded plugin = load(question.file, platform);
+    Loaded plugin = load(file.number(), platform);
     if (!plugin.findings.empty()) {
         return plugin.findings;
     }
@@ -130,11 +124,13 @@ std::vector<Finding> tried(Question const &question) {
         return {{"registration", problem}};
     }
     Root taken = emptyTree();
-    for (std::string const &file : question.earlier) {
-        if (inspectFile(file).empty()) {
-            Loaded const other = load(file, platform);
-            if (other.entry != nullptr) {
-                static_cast<void>(registered(other.entry, taken)); // its own troubles are told elsewhere
+    for (std::string const &earlier : question.earlier) {
+        Inspected other = inspectFile(earlier);
+        if (other.findings.empty()) {
+            Loaded const loaded = load(other.file.number(), platform);
+            other.file.keepForever();
+            if (loaded.entry != nullptr) {
+                static_cast<void>(registered(loaded.entry, taken)); // its own troubles are told elsewhere
             }
         }
     }
@@ -142,7 +138,7 @@ std::vector<Finding> tried(Question const &question) {
 }
 
 /// The trial's process: its standard streams are nobody's, what it finds goes through the pipe.
-[[noreturn]] void runTrial(Question const &question, int toParent) {
+[[noreturn]] void runTrial(Question const &question, Descriptor const &plugin, int toParent) {
     int const nowhere = open("/dev/null", O_RDWR | O_CLOEXEC);
     for (int const stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
         dup2(nowhere, stream);
@@ -152,7 +148,7 @@ std::vector<Finding> tried(Question const &question) {
     }
     setenv("TOVI_OFFLINE", "1", 1);
     std::string text;
-    for (Finding const &finding : tried(question)) {
+    for (Finding const &finding : tried(question, plugin)) {
         text += finding.check + '\0' + finding.detail + '\0';
     }
     text += '\0'; // came to its end
@@ -212,7 +208,7 @@ std::string endOf(int status) {
 
 } // namespace
 
-std::vector<Finding> tryOut(Question const &question) {
+std::vector<Finding> tryOut(Question const &question, Descriptor const &plugin) {
     int ends[2] = {-1, -1};
     if (pipe2(ends, O_CLOEXEC) != 0) {
         return {{"load", std::string("it cannot be tried: ") + std::strerror(errno)}};
@@ -220,7 +216,7 @@ std::vector<Finding> tryOut(Question const &question) {
     Descriptor const fromTrial(ends[0]);
     pid_t const child = fork();
     if (child == 0) {
-        runTrial(question, ends[1]);
+        runTrial(question, plugin, ends[1]);
     }
     close(ends[1]);
     if (child < 0) {

@@ -8,6 +8,7 @@
 namespace Tovicli::Cli {
 
 /// Loads and registers a plug-in as the tool would, in a process of its own that ends with it.
-std::vector<Finding> tryOut(Question const &question);
+/// @param plugin the file, which nothing speaks against
+std::vector<Finding> tryOut(Question const &question, Descriptor const &plugin);
 
 } // namespace Tovicli::Cli

@@ -13,6 +13,7 @@
 #include "TemporaryDirectory.h"
 #include "plugins/Directory.h"
 #include "plugins/Inspection.h"
+#include "plugins/Trial.h"
 
 namespace {
 
@@ -70,6 +71,20 @@ TEST_F(Inspecting, ADirectoryThatOthersCanWriteSpeaksAgainstItsFiles) {
     chmod(directory.path().c_str(), 0777);
     EXPECT_THAT(findings(directory / "a.so"),
                 ElementsAre("permissions: its directory: '" + directory.path() + "' can be written by others"));
+}
+
+TEST_F(Inspecting, fault_10_WhatWasLookedAtIsWhatIsTried) {
+    directory.addPlugin("behaves", "a.so");
+    TemporaryDirectory elsewhere;
+    elsewhere.addPlugin("crashes", "a.so");
+    TemporaryDirectory place;
+    std::filesystem::create_symlink(directory.path(), place / "link");
+    Question const question{place / "link/a.so", {}, TEST_LIBRARIES, timeout};
+    Inspected const inspected = inspectFile(question.file);
+    EXPECT_THAT(inspected.findings, IsEmpty());
+    std::filesystem::create_symlink(elsewhere.path(), place / "other");
+    std::filesystem::rename(place / "other", place / "link");
+    EXPECT_THAT(tryOut(question, inspected.file), IsEmpty());
 }
 
 TEST_F(Inspecting, WhatIsNoLibraryOfThisMachine) {
