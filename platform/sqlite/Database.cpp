@@ -2,6 +2,8 @@
 #include "sqlite/Database.h"
 
 #include <cerrno>
+#include <cstdlib>
+#include <memory>
 #include <new>
 #include <set>
 #include <utility>
@@ -27,11 +29,14 @@ int whyNotOpen(std::string const &path) {
     return S_ISDIR(status.st_mode) ? EISDIR : S_ISREG(status.st_mode) ? 0 : EINVAL;
 }
 
+std::string directoryOf(std::string const &path) {
+    auto const slash = path.rfind('/');
+    return slash == std::string::npos ? "." : path.substr(0, slash + 1);
+}
+
 /// True also when there is no such directory.
 bool mayMakeFileBeside(std::string const &path) {
-    auto const slash = path.rfind('/');
-    std::string const directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
-    return ::faccessat(AT_FDCWD, directory.c_str(), W_OK | X_OK, AT_EACCESS) == 0 || errno == ENOENT;
+    return ::faccessat(AT_FDCWD, directoryOf(path).c_str(), W_OK | X_OK, AT_EACCESS) == 0 || errno == ENOENT;
 }
 
 bool exists(char const *path) {
@@ -42,6 +47,13 @@ bool exists(char const *path) {
 /// SQLite takes some names for something other than a file (":memory:", "file:..."); one with a slash is always a file.
 std::string fileName(std::string const &path) {
     return path.front() == '/' ? path : "./" + path;
+}
+
+/// The same file by a name in which only the last part may be a link: SQLite refuses links anywhere or nowhere.
+std::string nameWithoutLinks(std::string const &path) {
+    std::unique_ptr<char, decltype(&std::free)> const directory(::realpath(directoryOf(path).c_str(), nullptr),
+                                                                &std::free);
+    return directory == nullptr ? path : directory.get() + path.substr(path.rfind('/'));
 }
 
 } // namespace
@@ -70,13 +82,22 @@ void Database::open(Options const &options, bool openedAgain) {
     if (mode_ == Mode::Create) {
         flags |= SQLITE_OPEN_CREATE;
     }
+    std::string name = fileName(path_);
+    if (options.refusesLink) {
+        flags |= SQLITE_OPEN_NOFOLLOW;
+        name = nameWithoutLinks(name);
+    }
     sqlite3 *opened = nullptr; // also when it fails, to ask why
-    int const code = sqlite3_open_v2(fileName(path_).c_str(), &opened, flags, nullptr);
+    int const code = sqlite3_open_v2(name.c_str(), &opened, flags, nullptr);
     handle_.reset(opened);
     if (code == SQLITE_OK) {
         sqlite3_extended_result_codes(opened, 1);
         sqlite3_busy_timeout(opened, static_cast<int>(options.busyTimeout.count()));
         return;
+    }
+    if (sqlite3_extended_errcode(opened) == SQLITE_CANTOPEN_SYMLINK) {
+        throw Error(ErrorKind::Io, named(identity_.kindName, path_) +
+                                       " is a symbolic link, which is not followed; it was left as it is");
     }
     int const reason = whyNotOpen(path_);
     if (reason == 0 && code == SQLITE_CANTOPEN && !openedAgain) {

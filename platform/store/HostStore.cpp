@@ -10,6 +10,18 @@
 
 namespace Store {
 
+namespace {
+
+/// A link could have whoever works in a root of somebody else's change a file outside of it.
+Sqlite::Options optionsOf(std::chrono::milliseconds busyTimeout) {
+    Sqlite::Options options;
+    options.busyTimeout = busyTimeout;
+    options.refusesLink = true;
+    return options;
+}
+
+} // namespace
+
 HostStore::HostStore(std::string const &root, Mode mode, std::chrono::milliseconds busyTimeout)
     : root_(root)
     , path_(Wire::Paths(root).hostStore())
@@ -26,7 +38,7 @@ Sqlite::Database *HostStore::reader() {
     if (!database_) {
         auto const how = mode_ == Mode::ReadWrite ? Sqlite::Mode::ReadWrite : Sqlite::Mode::QueryOnly;
         try {
-            database_ = std::make_unique<Sqlite::Database>(path_, identity(), how, Sqlite::Options{busyTimeout_});
+            database_ = std::make_unique<Sqlite::Database>(path_, identity(), how, optionsOf(busyTimeout_));
         } catch (Sqlite::Error const &error) {
             if (error.kind() != Sqlite::ErrorKind::Missing) {
                 throw;
@@ -46,7 +58,7 @@ Sqlite::Database &HostStore::writer() {
     if (reader() == nullptr) {
         makeDirectoryDurably(root_);
         database_ =
-            std::make_unique<Sqlite::Database>(path_, identity(), Sqlite::Mode::Create, Sqlite::Options{busyTimeout_});
+            std::make_unique<Sqlite::Database>(path_, identity(), Sqlite::Mode::Create, optionsOf(busyTimeout_));
         ++generation_;
     }
     return *database_;

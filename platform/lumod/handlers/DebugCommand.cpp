@@ -9,6 +9,18 @@ namespace Lumod {
 
 namespace {
 
+/// A year. What is far longer is past the end of the daemon's clock.
+constexpr int64_t longestPeriodUs = int64_t{365} * 24 * 3600 * 1000 * 1000;
+
+int64_t requestedPeriod(int64_t microseconds) {
+    if (microseconds > longestPeriodUs) {
+        throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
+                            fmt::format("{} us is longer than an unbind period may be; the longest is {} us, a year",
+                                        microseconds, longestPeriodUs));
+    }
+    return microseconds;
+}
+
 LogLevel requestedLevel(int64_t number) {
     auto const level = logLevelOf(number);
     if (!level) {
@@ -25,7 +37,7 @@ LogLevel requestedLevel(int64_t number) {
 
 Answer<ReplyPtr> debugCommand(Core &core, CallPtr const &call, Wire::Request::Reader request) {
     Wire::DebugCommand::Reader const command = request.getDebugCommand();
-    int64_t const periodUs = command.getUnbindPeriodUs();
+    int64_t const periodUs = requestedPeriod(command.getUnbindPeriodUs());
     if (command.getLogLevel() >= 0) {
         LogLevel const level = requestedLevel(command.getLogLevel());
         core.log.setLevel(level);

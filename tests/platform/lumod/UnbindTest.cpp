@@ -56,6 +56,22 @@ TEST_F(UnbindTest, TakesPlaceAtOnceWithPeriodZero) {
     EXPECT_TRUE(isBound(mounted)) << "zero is for now, not for ever";
 }
 
+TEST_F(UnbindTest, APeriodPastTheEndOfTheClockIsRefused) {
+    volumeRequest("unbind", uuid_);
+    int64_t const year = int64_t{365} * 24 * 3600 * 1000 * 1000;
+    for (int64_t const tooLong : {INT64_MAX, year + 1}) {
+        Reply const refused = ask([tooLong](Wire::Request::Builder request) {
+            request.initDebugCommand().setLogLevel(64);
+            request.getDebugCommand().setUnbindPeriodUs(tooLong);
+        });
+        EXPECT_EQ(refused.code(), ErrorCode::InvalidArgument);
+    }
+    EXPECT_FALSE(sink_.holds("the log level is trivia")) << "what is refused changes nothing";
+    EXPECT_EQ(ask(period(year)).code(), ErrorCode::Success);
+    advance(6 * kj::MINUTES);
+    EXPECT_TRUE(isBound(uuid_));
+}
+
 TEST_F(UnbindTest, APeriodCountsForThoseThatWaitAlready) {
     volumeRequest("unbind", uuid_);
     advance(2 * kj::SECONDS);

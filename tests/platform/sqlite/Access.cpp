@@ -42,6 +42,32 @@ TEST_F(AccessTest, KeepsAsMuchOfAFileAsItIsTold) {
     EXPECT_EQ(pragma(usual, "cache_size"), "-2000");
 }
 
+TEST_F(AccessTest, RefusesALinkWhereItIsToldTo) {
+    makeFile("a.db");
+    std::filesystem::create_symlink("a.db", at("link.db"));
+    std::filesystem::create_symlink("none.db", at("dangling.db"));
+    EXPECT_EQ(countItems(*std::make_unique<Database>(at("link.db"), kind(), Mode::ReadWrite)), 1);
+    Sqlite::Options options;
+    options.refusesLink = true;
+    for (Mode const mode : {Mode::Create, Mode::ReadWrite, Mode::QueryOnly}) {
+        for (std::string const &path : {at("link.db"), at("dangling.db")}) {
+            auto const error = errorOf([&] { Database(path, kind(), mode, options); });
+            ASSERT_TRUE(error);
+            EXPECT_EQ(error->kind(), ErrorKind::Io);
+            EXPECT_EQ(error->sentence(),
+                      "the test file '" + path + "' is a symbolic link, which is not followed; it was left as it is");
+        }
+    }
+    EXPECT_FALSE(exists(at("none.db")));
+    // A link that leads to the directory is nobody's but the caller's.
+    std::filesystem::create_directory_symlink(directory_, at("here"));
+    Database database(at("here/a.db"), kind(), Mode::ReadWrite, options);
+    EXPECT_EQ(countItems(database), 1);
+    auto const error = errorOf([&] { Database(at("nowhere/a.db"), kind(), Mode::ReadWrite, options); });
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::Missing);
+}
+
 TEST_F(AccessTest, TakesAFileBackOutOfAnotherJournalMode) {
     plainSql(makeFile("a.db"), "PRAGMA journal_mode=WAL");
     Database database(at("a.db"), kind(), Mode::ReadWrite);

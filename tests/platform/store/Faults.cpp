@@ -60,6 +60,19 @@ TEST_F(FaultsTest, fault_51_RefusesTheFileOfAnotherProgram) {
     expectRefused(Wire::ErrorCode::FileForeign);
 }
 
+TEST_F(FaultsTest, fault_54_FollowsNoLinkToAFileElsewhere) {
+    std::string const elsewhere = root_ + "-elsewhere";
+    HostStore(elsewhere, HostStore::Mode::ReadWrite).setOrkaContext("x");
+    std::filesystem::create_directories(root_);
+    std::filesystem::create_symlink(elsewhere + "/host.db", file());
+    expectRefused(Wire::ErrorCode::IoError);
+    std::filesystem::remove(file());
+    std::filesystem::create_symlink(elsewhere + "/new.db", file());
+    HostStore store(root_, HostStore::Mode::ReadWrite);
+    ASSERT_TRUE(failureOf([&] { store.setOrkaContext("y"); }));
+    EXPECT_FALSE(std::filesystem::exists(elsewhere + "/new.db"));
+}
+
 TEST_F(FaultsTest, fault_48_RefusesADamagedStore) {
     std::filesystem::create_directories(root_);
     std::ofstream(file()) << "not a database at all";

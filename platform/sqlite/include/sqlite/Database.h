@@ -57,6 +57,8 @@ struct Options {
     std::chrono::milliseconds busyTimeout{5000};
     /// How much of the file is kept in memory at most, in KiB, taken as pages are read; nothing: SQLite's own 2000.
     std::optional<int> cacheKib = std::nullopt;
+    /// Whether a symbolic link in the place of the file is refused. Links that lead to its directory are followed.
+    bool refusesLink = false;
 };
 
 class Database {
