@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <algorithm>
+#include <charconv>
 #include <csignal>
 #include <memory>
 #include <ostream>
@@ -40,6 +41,25 @@ struct Options {
     MisbehaviourSpec misbehaviour;
 };
 
+/// The host of ADDRESS:PORT, as it will stand in the URL.
+std::string hostOf(std::string const &listen) {
+    auto const colon = listen.rfind(':');
+    auto const host = listen.substr(0, colon);
+    bool const isHost =
+        host.find_first_not_of("abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789-._:[]") ==
+        std::string::npos;
+    auto const port = colon == std::string::npos ? "" : listen.substr(colon + 1);
+    uint16_t number = 0;
+    auto const *const end = port.data() + port.size();
+    auto const read = std::from_chars(port.data(), end, number);
+    bool const isPort = read.ec == std::errc() && read.ptr == end;
+    // The library takes these two names for sockets of this machine.
+    if (host.empty() || !isHost || !isPort || host == "unix" || host == "unix-abstract") {
+        throw UsageError("--listen is ADDRESS:PORT, not '" + listen + "'");
+    }
+    return host;
+}
+
 std::string checkedBug(std::string name) {
     auto const &bugs = Orka::Conformance::bugs();
     auto const isIt = [&](Orka::Conformance::Bug const &bug) { return bug.name == name; };
@@ -70,11 +90,7 @@ Options optionsOf(Words const &words) {
     Options options;
     options.array = sorted.named({"ARRAYFILE"})[0];
     options.listen = sorted.value("--listen").value_or(defaultListen);
-    auto const colon = options.listen.rfind(':');
-    if (colon == std::string::npos || colon == 0) {
-        throw UsageError("--listen is ADDRESS:PORT, not '" + options.listen + "'");
-    }
-    options.host = options.listen.substr(0, colon);
+    options.host = hostOf(options.listen);
     options.certificate = sorted.value("--cert").value_or("");
     options.key = sorted.value("--key").value_or("");
     if (options.certificate.empty() != options.key.empty()) {
@@ -96,6 +112,9 @@ Options optionsOf(Words const &words) {
     misbehaviour.errorRate = sorted.number("--error-rate", 0, 100).value_or(0);
     misbehaviour.seed = static_cast<uint64_t>(sorted.number("--seed", 0, INT64_MAX).value_or(1));
     misbehaviour.operation = sorted.value("--on").value_or("");
+    if (!misbehaviour.operation.empty() && !Orka::ProviderService::serves(misbehaviour.operation)) {
+        throw UsageError("--on is an operation, such as getMetadata, not '" + misbehaviour.operation + "'");
+    }
     misbehaviour.times = sorted.number("--times", 0, INT64_MAX);
     if (auto const misdeed = sorted.value("--misbehave")) {
         misbehaviour.misdeed = misdeedNamed(*misdeed);
@@ -169,7 +188,7 @@ void serve(Words const &words, Console const &console) {
     Misbehaviour misbehaviour(service, timer, options.misbehaviour);
     auto port = listenAt(io, options.listen);
     auto const url = fmt::format("https://{}:{}{}", options.host, port->getPort(), servedPath);
-    Server server(kj::mv(port), identity, misbehaviour, timer);
+    Server server(kj::mv(port), identity, misbehaviour, service, timer);
     auto serving = server.run();
     console.out << url << std::endl;
     if (!options.readyFile.empty()) {

@@ -9,6 +9,7 @@ namespace {
 
 constexpr kj::Duration handshakeTime = 10 * kj::SECONDS;
 constexpr kj::Duration stopTime = 5 * kj::SECONDS;
+constexpr kj::Duration acceptPause = 100 * kj::MILLISECONDS;
 /// Longer than clients keep an idle connection, so that it is they who close it.
 constexpr kj::Duration idleTime = 15 * kj::SECONDS;
 
@@ -26,28 +27,39 @@ kj::TlsContext contextFor(Identity const &identity) {
     }
 }
 
-kj::HttpServerSettings settings() {
+kj::HttpServerSettings settingsWith(kj::HttpServerErrorHandler &errors) {
     kj::HttpServerSettings result;
     result.pipelineTimeout = idleTime;
+    result.errorHandler = errors;
     return result;
 }
 
 } // namespace
 
 Server::Server(kj::Own<kj::ConnectionReceiver> port, Identity const &identity, kj::HttpService &service,
-               kj::Timer &timer)
+               kj::HttpServerErrorHandler &errors, kj::Timer &timer)
     : port_(kj::mv(port))
     , timer_(timer)
     , table_(kj::HttpHeaderTable::Builder().build())
     , tls_(contextFor(identity))
-    , http_(timer, *table_, service, settings())
+    , http_(timer, *table_, service, settingsWith(errors))
     , connections_(*this) {}
 
 kj::Promise<void> Server::run() {
-    return port_->accept().then([this](kj::Own<kj::AsyncIoStream> &&stream) {
-        connections_.add(serve(kj::mv(stream)));
-        return run();
-    });
+    // At once, and not by its promise, is how a port says that it cannot accept.
+    return kj::evalNow([this] { return port_->accept(); })
+        .then(
+            [this](kj::Own<kj::AsyncIoStream> &&stream) {
+                connections_.add(serve(kj::mv(stream)));
+                return run();
+            },
+            [this](kj::Exception &&exception) -> kj::Promise<void> {
+                if (exception.getType() != kj::Exception::Type::OVERLOADED) {
+                    return kj::mv(exception);
+                }
+                // No descriptor or no memory is left. It is the clients that have them who give some back.
+                return timer_.afterDelay(acceptPause).then([this] { return run(); });
+            });
 }
 
 kj::Promise<void> Server::serve(kj::Own<kj::AsyncIoStream> stream) {

@@ -15,9 +15,12 @@ namespace Orkasim {
 /// its handshake keeps nobody else waiting, and is dropped after ten seconds.
 class Server final : private kj::TaskSet::ErrorHandler {
 public:
-    Server(kj::Own<kj::ConnectionReceiver> port, Identity const &identity, kj::HttpService &service, kj::Timer &timer);
+    /// @param errors answers what never comes to the service, or fails there
+    Server(kj::Own<kj::ConnectionReceiver> port, Identity const &identity, kj::HttpService &service,
+           kj::HttpServerErrorHandler &errors, kj::Timer &timer);
 
-    /// Never done; rejected when the port cannot be listened at any more.
+    /// Never done; rejected when the port cannot be listened at any more. While the system has no descriptor for one
+    /// more client, new ones wait.
     kj::Promise<void> run();
     /// Takes no more requests; done when those that were begun are, or after five seconds.
     kj::Promise<void> stop();

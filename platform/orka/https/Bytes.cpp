@@ -1,9 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "https/Bytes.h"
 
+#include <string_view>
 #include <utility>
 
+#include <strings.h>
+
 #include <kj/array.h>
+
+#include "https/Protocol.h"
 
 namespace Orka::Https {
 
@@ -44,6 +49,16 @@ kj::Promise<std::optional<std::string>> readUpTo(kj::AsyncInputStream &stream, s
     auto reading = kj::heap<Reading>(Reading{stream, most});
     auto promise = reading->go();
     return promise.attach(kj::mv(reading));
+}
+
+bool isJson(kj::HttpHeaders const &headers) {
+    KJ_IF_MAYBE (value, headers.get(kj::HttpHeaderId::CONTENT_TYPE)) {
+        std::string_view type(value->cStr());
+        type = type.substr(0, type.find_first_of("; \t"));
+        std::string_view const json(jsonType);
+        return type.size() == json.size() && ::strncasecmp(type.data(), json.data(), json.size()) == 0;
+    }
+    return false;
 }
 
 } // namespace Orka::Https

@@ -26,13 +26,6 @@ bool asksForPatience(unsigned status) {
            status == statusGatewayTimeout;
 }
 
-bool isJson(kj::HttpHeaders const &headers) {
-    KJ_IF_MAYBE (type, headers.get(kj::HttpHeaderId::CONTENT_TYPE)) {
-        return std::string_view(type->cStr()).substr(0, std::string_view(jsonType).size()) == jsonType;
-    }
-    return false;
-}
-
 /// Cut where a character begins, not within one.
 std::string shortened(std::string text) {
     if (text.size() > messageBytesMax) {

@@ -17,9 +17,10 @@ constexpr kj::Duration lookupTime = 60 * kj::SECONDS;
 /// What the system said, without what the library puts around it.
 std::string reasonOf(kj::Exception const &exception) {
     std::string_view text(exception.getDescription().cStr());
-    constexpr std::string_view mark = "reason = ";
-    if (auto const found = text.find(mark); found != std::string_view::npos) {
-        return std::string(text.substr(found + mark.size()));
+    for (std::string_view const mark : {"reason = ", "gai_strerror(status) = "}) {
+        if (auto const found = text.find(mark); found != std::string_view::npos) {
+            return std::string(text.substr(found + mark.size()));
+        }
     }
     if (auto const found = text.rfind(": "); found != std::string_view::npos) {
         text.remove_prefix(found + 2);
@@ -33,6 +34,12 @@ std::string reasonOf(kj::Exception const &exception) {
 bool speaksOfTrust(kj::Exception const &exception) {
     return std::string_view(exception.getDescription().cStr()).find("certificate is not trusted") !=
            std::string_view::npos;
+}
+
+/// Whether a certificate is refused for who signed it, not for whom it names or until when it holds.
+bool isOfAStranger(std::string const &reason) {
+    return reason.find("self-signed") != std::string::npos || reason.find("issuer") != std::string::npos ||
+           reason.find("verify the first") != std::string::npos;
 }
 
 } // namespace
@@ -63,8 +70,11 @@ Wire::Failure Line::unreachable(Step step, kj::Exception const &exception) {
         if (speaksOfTrust(exception)) {
             // Whoever mends the system's store is heard at the next try.
             trust_.forget();
-            sentence =
-                "the provider at " + authority_ + " showed a certificate that is not trusted: " + reasonOf(exception);
+            auto const reason = reasonOf(exception);
+            sentence = "the provider at " + authority_ + " showed a certificate that is not trusted: " + reason;
+            if (auto const advice = trust_.advice(); isOfAStranger(reason) && !advice.empty()) {
+                sentence += "; " + advice;
+            }
         } else {
             sentence = "the provider at " + authority_ + " did not agree on TLS: " + reasonOf(exception);
         }

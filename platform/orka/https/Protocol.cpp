@@ -22,7 +22,7 @@ constexpr std::array<ErrorName, 13> names{{
     {"noAccessibleEndpoint", ErrorCode::NoAccessibleEndpoint, statusConflict},
     {"busy", ErrorCode::ProviderBusy, statusUnavailable},
     {"deadlineExceeded", ErrorCode::DeadlineExceeded, statusGatewayTimeout},
-    {"notPermitted", ErrorCode::NotPermitted, 403},
+    {"notPermitted", ErrorCode::NotPermitted, statusForbidden},
     {"unknownOperation", ErrorCode::UnknownOperation, statusNotFound},
 }};
 

@@ -33,6 +33,7 @@ inline constexpr char const *jsonType = "application/json";
 /// HTTP statuses that the protocol speaks of.
 inline constexpr unsigned statusDone = 200;
 inline constexpr unsigned statusBadRequest = 400;
+inline constexpr unsigned statusForbidden = 403;
 inline constexpr unsigned statusNotFound = 404;
 inline constexpr unsigned statusMethodNotAllowed = 405;
 inline constexpr unsigned statusConflict = 409;
@@ -40,6 +41,7 @@ inline constexpr unsigned statusTooLarge = 413;
 inline constexpr unsigned statusUnsupportedMediaType = 415;
 inline constexpr unsigned statusTooManyRequests = 429;
 inline constexpr unsigned statusBroken = 500;
+inline constexpr unsigned statusNotImplemented = 501;
 inline constexpr unsigned statusBadGateway = 502;
 inline constexpr unsigned statusUnavailable = 503;
 inline constexpr unsigned statusGatewayTimeout = 504;

@@ -35,8 +35,10 @@ constexpr std::string_view statusTextOf(unsigned status) {
         return "Service Unavailable";
     case statusGatewayTimeout:
         return "Gateway Timeout";
-    case 403:
+    case statusForbidden:
         return "Forbidden";
+    case statusNotImplemented:
+        return "Not Implemented";
     default:
         return "Internal Server Error";
     }
@@ -47,13 +49,6 @@ constexpr std::size_t heldListsMax = 10000;
 
 std::string errorBody(std::string_view code, std::string const &message) {
     return bodyOf(ErrorAnswer{{std::string(code), message}});
-}
-
-bool speaksJson(kj::HttpHeaders const &headers) {
-    KJ_IF_MAYBE (type, headers.get(kj::HttpHeaderId::CONTENT_TYPE)) {
-        return std::string_view(type->cStr()).substr(0, std::string_view(jsonType).size()) == jsonType;
-    }
-    return false;
 }
 
 } // namespace
@@ -84,18 +79,43 @@ kj::Promise<void> ProviderService::request(kj::HttpMethod method, kj::StringPtr 
     if (method != kj::HttpMethod::POST) {
         return refuse(statusMethodNotAllowed, "invalidArgument", "an operation is asked for by POST");
     }
-    if (!speaksJson(headers)) {
+    if (!isJson(headers)) {
         return refuse(statusUnsupportedMediaType, "invalidArgument", "a request's body is application/json");
     }
     std::string operation(path.substr(path_.size() + versionSegment.size()));
     return readUpTo(requestBody, requestBytesMax)
-        .then([this, operation = std::move(operation)](std::optional<std::string> &&body) -> kj::Promise<Reply> {
-            if (!body) {
-                return Reply{statusTooLarge, errorBody("tooLarge", "a request's body may have 1 MiB")};
-            }
-            return answer(operation, *std::move(body));
-        })
+        .then(
+            [this, operation = std::move(operation)](std::optional<std::string> &&body) -> kj::Promise<Reply> {
+                if (!body) {
+                    return Reply{statusTooLarge, errorBody("tooLarge", "a request's body may have 1 MiB")};
+                }
+                return answer(operation, *std::move(body));
+            },
+            [](kj::Exception &&exception) -> kj::Promise<Reply> {
+                if (exception.getType() == kj::Exception::Type::DISCONNECTED) {
+                    return kj::mv(exception);
+                }
+                return Reply{statusBadRequest, errorBody("invalidArgument", "the request's body is not HTTP")};
+            })
         .then([this, &response](Reply &&reply) { return send(response, reply); });
+}
+
+kj::Promise<void> ProviderService::handleClientProtocolError(kj::HttpHeaders::ProtocolError error, Response &response) {
+    return send(response, {error.statusCode, errorBody("invalidArgument", fmt::format("the request cannot be read: {}",
+                                                                                      error.description.cStr()))});
+}
+
+kj::Promise<void> ProviderService::handleApplicationError(kj::Exception exception, kj::Maybe<Response &> response) {
+    if (exception.getType() != kj::Exception::Type::DISCONNECTED) {
+        KJ_IF_MAYBE (open, response) {
+            return send(*open, {statusBroken, errorBody("arrayFailure", "the request could not be carried out")});
+        }
+    }
+    return kj::READY_NOW;
+}
+
+bool ProviderService::serves(std::string_view operation) {
+    return ServiceOperations::named(operation) != nullptr;
 }
 
 kj::Promise<ProviderService::Reply> ProviderService::answer(std::string_view operation, std::string body) {

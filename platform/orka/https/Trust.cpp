@@ -83,6 +83,13 @@ kj::Promise<kj::Own<kj::AsyncIoStream>> Trust::secure(kj::Own<kj::AsyncIoStream>
     return context().wrapClient(kj::mv(stream), host_.c_str());
 }
 
+std::string Trust::advice() const {
+    if (path_.empty()) {
+        return "";
+    }
+    return stamp_ ? "'" + path_ + "' does not vouch for it" : "it would have to be pinned in '" + path_ + "'";
+}
+
 kj::TlsContext &Trust::context() {
     auto const stamp = stampOfFile();
     if (context_ && stamp == stamp_) {

@@ -30,10 +30,8 @@ public:
     void forget() {
         context_.reset();
     }
-    /// The file to pin a certificate in; empty when there is no place for one.
-    std::string const &path() const {
-        return path_;
-    }
+    /// What to look at when nobody that is trusted vouches for a certificate; empty when there is no place to pin one.
+    std::string advice() const;
 
 private:
     /// Tells one state of the pinned file from another.

@@ -71,6 +71,10 @@ Url parseUrl(std::string const &text) {
         if (!std::all_of(url.host.begin(), url.host.end(), isHostCharacter)) {
             refuse(text, "its host is no name and no address");
         }
+        if (url.host == "unix" || url.host == "unix-abstract") {
+            // The library would take it, with the port, for the path of a socket of this machine.
+            refuse(text, "its host cannot be told from a local socket; name it with its domain");
+        }
     }
     if (url.host.empty()) {
         refuse(text, "it names no host, as https://host:port/path does");

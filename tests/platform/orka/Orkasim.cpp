@@ -145,10 +145,16 @@ TEST_F(OrkasimTest, tellsWhatIsWrongWithTheWords) {
              {{"serve"}, "ARRAYFILE is missing"},
              {{"serve", "--listen"}, "--listen needs a value"},
              {{"serve", "--listen", "here", "a"}, "--listen is ADDRESS:PORT, not 'here'"},
+             {{"serve", "--listen", "*:0", "a"}, "--listen is ADDRESS:PORT, not '*:0'"},
+             {{"serve", "--listen", "127.0.0.1:", "a"}, "--listen is ADDRESS:PORT, not '127.0.0.1:'"},
+             {{"serve", "--listen", "127.0.0.1:65536", "a"}, "--listen is ADDRESS:PORT, not '127.0.0.1:65536'"},
+             {{"serve", "--listen", "unix:1", "a"}, "--listen is ADDRESS:PORT, not 'unix:1'"},
              {{"serve", "--latency=soon", "a"}, "--latency is a whole number from 0 to 3600000, not 'soon'"},
              {{"serve", "--seed=1", "--seed=2", "a"}, "--seed stands there twice"},
              {{"serve", "--cert", "c", "a"}, "--cert and --key go together"},
              {{"serve", "--on", "getMetadata", "a"}, "--on and --times tell when to --misbehave"},
+             {{"serve", "--misbehave", "hang", "--on", "getmetadata", "a"},
+              "--on is an operation, such as getMetadata, not 'getmetadata'"},
              {{"serve", "--misbehave", "steal", "a"},
               "--misbehave is one of hang, drip, endless, huge, bomb, garbage, truncated, redirect, reset, "
               "unavailable, "

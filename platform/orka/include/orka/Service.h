@@ -24,7 +24,7 @@ namespace Https {
 class HeldLists;
 }
 
-class ProviderService final : public kj::HttpService {
+class ProviderService final : public kj::HttpService, public kj::HttpServerErrorHandler {
 public:
     /// @param provider outlives the service, as does the timer, which is the provider's
     /// @param path what stands before the version in every path, as "/orka"
@@ -37,6 +37,14 @@ public:
 
     kj::Promise<void> request(kj::HttpMethod method, kj::StringPtr url, kj::HttpHeaders const &headers,
                               kj::AsyncInputStream &requestBody, Response &response) override;
+
+    /// What is no request is answered like one that is refused.
+    kj::Promise<void> handleClientProtocolError(kj::HttpHeaders::ProtocolError error, Response &response) override;
+    /// Tells a client that it failed, and nothing of this program's inside.
+    kj::Promise<void> handleApplicationError(kj::Exception exception, kj::Maybe<Response &> response) override;
+
+    /// Whether there is an operation of this name.
+    static bool serves(std::string_view operation);
 
 private:
     friend struct ServiceOperations;

@@ -37,7 +37,8 @@ kj::Promise<kj::Own<kj::NetworkAddress>> FakeNetwork::parseAddress(kj::StringPtr
         return kj::NEVER_DONE;
     }
     if (way == Way::LookupFails) {
-        return KJ_EXCEPTION(FAILED, "DNS lookup failed.; host = array.test; Name or service not known");
+        return KJ_EXCEPTION(FAILED, "DNS lookup failed.; params.host = array.test; params.service = ; "
+                                    "gai_strerror(status) = Name or service not known");
     }
     kj::Own<kj::NetworkAddress> found = kj::heap<FakeAddress>(*this);
     return kj::mv(found);

@@ -52,6 +52,13 @@ TEST(Url, EachCharacterThatMayNotStandInItsPlaceIsRefused) {
     }
 }
 
+TEST(Url, AHostIsNoSocketOfThisMachine) {
+    for (std::string const host : {"unix", "unix-abstract", "unix:8443"}) {
+        EXPECT_EQ(parsed("https://" + host), "its host cannot be told from a local socket; name it with its domain");
+    }
+    EXPECT_EQ(parsed("https://unix.example:8443"), "unix.example:8443 ");
+}
+
 TEST(Url, APortIsANumberBehindAColon) {
     for (std::string const port : {":", ":0", ":65536", ":99999999999999999999", ":-1", ":1x", ": 1", ":x"}) {
         EXPECT_EQ(parsed("https://host" + port), "its port is no number from 1 to 65535") << port;
