@@ -155,6 +155,26 @@ TEST_F(OpenApiTest, describesEveryMessageAsItIsReadAndWritten) {
     EXPECT_EQ(document_["components"]["schemas"].MemberCount(), declared.size());
 }
 
+TEST_F(OpenApiTest, thePageForImplementersNamesEveryMemberAndOperation) {
+    auto const page = bytesOf(TOVI_DOCS "/provider-protocol.md");
+    auto const isNamed = [&](std::string const &name) {
+        return page.find('`' + name + '`') != std::string::npos || page.find('`' + name + "?`") != std::string::npos;
+    };
+    rapidjson::Value const &schemas = document_["components"]["schemas"];
+    for (auto const &one : schemas.GetObject()) {
+        if (one.value.HasMember("properties")) {
+            for (auto const &member : one.value["properties"].GetObject()) {
+                EXPECT_TRUE(isNamed(member.name.GetString()) || std::string("error") == member.name.GetString())
+                    << one.name.GetString() << '.' << member.name.GetString();
+            }
+        }
+    }
+    rapidjson::Value const &paths = document_["paths"];
+    for (auto const &path : paths.GetObject()) {
+        EXPECT_TRUE(isNamed(std::string(path.name.GetString()).substr(4))) << path.name.GetString();
+    }
+}
+
 TEST_F(OpenApiTest, describesEveryOperationThatIsServedAndNoOther) {
     int count = 0;
     rapidjson::Value const &paths = document_["paths"];
