@@ -338,22 +338,31 @@ FormatSettings Tool::formatSettings(AutoCli::Command &command,
     return formatting;
 }
 
+/// Offline, a command hears only that no daemon answers; why there is no session was found out when plug-ins were
+/// registered, and may be that this user may not use the socket.
+std::optional<LastFailure> Tool::causeOf(Outcome const &outcome) const {
+    bool const isOffline = registration_.daemonMissing && saysDaemonDead(outcome.cause);
+    bool const wasOther = registration_.daemonFailure && !saysDaemonDead(registration_.daemonFailure);
+    return isOffline && wasOther ? registration_.daemonFailure : outcome.cause;
+}
+
 void Tool::tell(Outcome const &outcome) {
     bool const daemonDead = saysDaemonDead(outcome.cause);
     if (registration_.daemonMissing && !daemonDead) {
         report_.warn(daemonSentence());
     }
+    std::optional<LastFailure> const cause = causeOf(outcome);
     if (outcome.status == ExitStatus::Completed) {
-        if (outcome.cause) {
-            report_.warn(outcome.cause->sentence); // swallowed by the command, which could do without
+        if (cause) {
+            report_.warn(cause->sentence); // swallowed by the command, which could do without
         }
         return;
     }
-    std::string hint = outcome.cause ? hintFor(outcome.cause->code, settings_.root, requestId_) : std::string();
-    if (daemonDead && !contains(outcome.message + outcome.cause->sentence, socketPath())) {
-        hint = "its socket is " + socketPath() + "; " + hint;
+    std::string hint = cause ? hintFor(cause->code, settings_.root, requestId_) : std::string();
+    if (daemonDead && !contains(outcome.message + cause->sentence, socketPath())) {
+        hint = "its socket is " + socketPath() + (hint.empty() ? "" : "; ") + hint;
     }
-    report_.fail(outcome.message, outcome.cause, hint);
+    report_.fail(outcome.message, cause, hint);
 }
 
 std::string Tool::socketPath() const {

@@ -67,6 +67,7 @@ private:
     ExitStatus runCommand(Plexa::AutoCli::Command &command, CommandLine const &line);
     /// Calls the command, with whoever waits told that it is at work.
     Outcome work(Plexa::AutoCli::Command &command, CommandLine const &line);
+    std::optional<LastFailure> causeOf(Outcome const &outcome) const;
     void tell(Outcome const &outcome);
     void traceParsed(CommandLine const &line);
     void startTrace(std::optional<std::string> const &logLevel);

@@ -8,11 +8,15 @@
 
 #include <sys/socket.h>
 
+#include <capnp/message.h>
+#include <capnp/serialize.h>
 #include <fmt/format.h>
 #include <kj/async-unix.h>
 
 #include "Connection.h"
 #include "Shutdown.h"
+#include "wire/Failure.h"
+#include "wire/lumod.capnp.h"
 
 namespace Lumod {
 
@@ -26,6 +30,17 @@ constexpr kj::Duration lastPatience = 500 * kj::MILLISECONDS;
 constexpr kj::Duration acceptPause = 100 * kj::MILLISECONDS;
 /// Connections to take before the others have their turn.
 constexpr int acceptsInARow = 64;
+
+/// The last words to whoever is not admitted. Said once: for him nobody waits.
+void sayWhyNot(int client, std::string const &sentence) {
+    capnp::MallocMessageBuilder message;
+    auto failure = message.initRoot<Wire::Reply>().initFailure(); // with id 0: it answers no request in particular
+    failure.setCode(static_cast<int32_t>(Wire::ErrorCode::NotPermitted));
+    failure.setSentence(sentence.c_str());
+    auto const words = capnp::messageToFlatArray(message);
+    auto const bytes = words.asBytes();
+    static_cast<void>(::send(client, bytes.begin(), bytes.size(), MSG_DONTWAIT | MSG_NOSIGNAL));
+}
 
 } // namespace
 
@@ -101,6 +116,7 @@ private:
                             peer ? fmt::format("refused a connection of user {} (group {}, process {})", peer->uid,
                                                peer->gid, peer->pid)
                                  : std::string("refused a connection of an unknown user"));
+            sayWhyNot(client.get(), refusal(peer));
             return;
         }
         using Flags = kj::LowLevelAsyncIoProvider;
@@ -110,6 +126,13 @@ private:
         ++count_;
         auto served = kj::evalLater([connection = connection.get()] { return connection->run(); });
         connections_.add(served.attach(kj::mv(connection), kj::defer([this] { --count_; })));
+    }
+
+    std::string refusal(std::optional<Peer> const &peer) const {
+        return fmt::format("{} may not use this daemon; it serves root{}{}",
+                           peer ? fmt::format("user {}", peer->uid) : std::string("an unknown user"),
+                           admission_.ownUid != 0 ? fmt::format(", user {}", admission_.ownUid) : std::string(),
+                           admission_.group ? fmt::format(" and the group {}", *admission_.group) : std::string());
     }
 
     void taskFailed(kj::Exception &&exception) override {

@@ -243,6 +243,10 @@ TEST_F(ServerTest, fault_57_AnotherUserIsRefusedAndLogged) {
     client->send(framed(ping));
     turn();
     EXPECT_TRUE(client->isClosed());
+    WireReply const words = parsed(client->takeMessage().value());
+    EXPECT_EQ(words.id, 0U);
+    EXPECT_EQ(words.code, ErrorCode::NotPermitted);
+    EXPECT_EQ(words.sentence, "user 65534 may not use this daemon; it serves root");
     EXPECT_FALSE(client->takeMessage().has_value());
     EXPECT_TRUE(sink_.holds("refused a connection of user 65534"));
 }

@@ -250,6 +250,20 @@ TEST(Outcomes, fault_33_DaemonAbsentIsOneWarningOrOneLine) {
     EXPECT_EQ(harness.errors, "tovicli: unknown option '--bogus' (try 'tovicli storage sample --help')\n");
 }
 
+TEST(Outcomes, fault_57_ASocketThatMayNotBeUsedIsNoDeadDaemon) {
+    ToolHarness harness;
+    std::string const why = "the daemon's socket /r/run/lumod.sock may not be used: Permission denied";
+    harness.plugins.registration.daemonMissing = true;
+    harness.plugins.registration.daemonFailure = LastFailure{6, why, ""};
+    harness.command->behaviour = [&](Input const &, Output &output) {
+        harness.plugins.failure = LastFailure{10, "no daemon answers at /r/run/lumod.sock", ""}; // said offline
+        output.SetMessage("Unable to load");
+        output.Complete();
+    };
+    EXPECT_EQ(harness.run({"--root=/r", "storage", "sample"}), 3);
+    EXPECT_EQ(harness.errors, "tovicli: Unable to load: " + why + "\n");
+}
+
 TEST(Outcomes, fault_33_WithoutTheCauseTheSocketIsNamedAllTheSame) {
     ToolHarness harness;
     harness.plugins.registration.daemonMissing = true;
