@@ -45,6 +45,10 @@ Failure Exchange::failure(ErrorCode code, Asked const &asked, std::string const 
     return {code, fmt::format("the provider at {} answered {} {}", authority(), asked.operation, did)};
 }
 
+std::string Exchange::pathOf(Asked const &asked) const {
+    return fmt::format("{}{}{}", line_->url().path, versionSegment, asked.operation);
+}
+
 Failure Exchange::outOfTime(Asked const &asked) const {
     char const *did = "did not answer {} before the deadline";
     switch (*asked.step) {
@@ -121,7 +125,7 @@ kj::Promise<Exchange::Attempt> Exchange::over(kj::Own<Connection> connection, st
                headers.set(kj::HttpHeaderId::CONTENT_TYPE, jsonType);
                headers.add("Accept", jsonType);
                headers.add("Accept-Encoding", "identity");
-               auto const path = fmt::format("{}{}{}", line_->url().path, versionSegment, asked->operation);
+               auto const path = pathOf(*asked);
                auto request = client.request(kj::HttpMethod::POST, path.c_str(), headers, asked->body.size());
                auto sending = request.body->write(asked->body.data(), asked->body.size())
                                   .attach(kj::mv(request.body), std::shared_ptr<Asked>(asked))
@@ -206,6 +210,10 @@ Exchange::Attempt Exchange::judge(unsigned status, std::string body, Asked &aske
     auto sentence = answer.error.message.empty()
                         ? failure(ErrorCode::IoError, asked, "with the error " + quoted(answer.error.code)).sentence()
                         : shortened(answer.error.message);
+    if (answer.error.code == unknownVersion || answer.error.code == unknownOperation) {
+        // No array's words: it is the way that is wrong, or the other end is of another release.
+        sentence = fmt::format("the provider at {} does not serve {}: {}", authority(), pathOf(asked), sentence);
+    }
     return {Failure(known == nullptr ? ErrorCode::IoError : known->code, std::move(sentence)), isWorthRepeating, false};
 }
 

@@ -60,6 +60,7 @@ private:
     Attempt judge(unsigned status, std::string body, Asked &asked) const;
     Wire::Failure failure(Wire::ErrorCode code, Asked const &asked, std::string const &did) const;
     Wire::Failure outOfTime(Asked const &asked) const;
+    std::string pathOf(Asked const &asked) const;
 
     kj::Own<Line> line_;
     kj::Timer &timer_;

@@ -23,7 +23,7 @@ constexpr std::array<ErrorName, 13> names{{
     {"busy", ErrorCode::ProviderBusy, statusUnavailable},
     {"deadlineExceeded", ErrorCode::DeadlineExceeded, statusGatewayTimeout},
     {"notPermitted", ErrorCode::NotPermitted, statusForbidden},
-    {"unknownOperation", ErrorCode::UnknownOperation, statusNotFound},
+    {unknownOperation, ErrorCode::UnknownOperation, statusNotFound},
 }};
 
 } // namespace

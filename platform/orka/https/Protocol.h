@@ -48,6 +48,9 @@ inline constexpr unsigned statusGatewayTimeout = 504;
 
 /// A page token that the server does not know any more; the client begins the list anew.
 inline constexpr std::string_view stalePage = "stalePage";
+/// What a server says that has no such version, or whose version has no such operation.
+inline constexpr std::string_view unknownVersion = "unknownVersion";
+inline constexpr std::string_view unknownOperation = "unknownOperation";
 
 /// What an answer with an error may name as its code.
 struct ErrorName {

@@ -73,7 +73,7 @@ kj::Promise<void> ProviderService::request(kj::HttpMethod method, kj::StringPtr 
         return send(response, {status, errorBody(code, message)});
     };
     if (path.substr(0, path_.size()) != path_ || path.substr(path_.size(), versionSegment.size()) != versionSegment) {
-        return refuse(statusNotFound, "unknownVersion",
+        return refuse(statusNotFound, unknownVersion,
                       fmt::format("there is nothing at this path; operations are at {}{}", path_, versionSegment));
     }
     if (method != kj::HttpMethod::POST) {
@@ -122,7 +122,7 @@ kj::Promise<ProviderService::Reply> ProviderService::answer(std::string_view ope
     auto const work = ServiceOperations::named(operation);
     if (work == nullptr) {
         return Reply{statusNotFound,
-                     errorBody("unknownOperation", fmt::format("there is no operation {}", quoted(operation)))};
+                     errorBody(unknownOperation, fmt::format("there is no operation {}", quoted(operation)))};
     }
     auto promise = [&]() -> kj::Promise<Outcome<std::string>> {
         auto begun = outcomeOf([&] { return work(ServiceOperations{*this}, body); });

@@ -191,7 +191,7 @@ TEST_F(OpenApiTest, listsEveryErrorThatAnAnswerMayName) {
     for (auto const &name : schema("ErrorBody")["properties"]["code"]["x-known"].GetArray()) {
         listed.insert(name.GetString());
         std::string const text(name.GetString());
-        EXPECT_TRUE(errorNamed(text) != nullptr || text == stalePage || text == "unknownVersion") << text;
+        EXPECT_TRUE(errorNamed(text) != nullptr || text == stalePage || text == unknownVersion) << text;
     }
     for (auto const code :
          {Wire::ErrorCode::IoError, Wire::ErrorCode::InvalidArgument, Wire::ErrorCode::NoSuchContainer,

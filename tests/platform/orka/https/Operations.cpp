@@ -62,6 +62,18 @@ TEST_F(HttpsOperationTest, refusesInTheArraysOwnWordsAndCodes) {
     both([&](auto &provider) { return sentence(provider.bindVirtualVolume(context(), goldId, webId, "no such")); });
 }
 
+TEST_F(HttpsOperationTest, namesProviderAndPathWhenTheWayIsWrong) {
+    serve();
+    EXPECT_EQ(
+        sentence(newClient("https://array.test:8443/elsewhere")->queryStorageArray(context())),
+        "the provider at array.test:8443 does not serve /elsewhere/v1/queryStorageArray: there is nothing at this "
+        "path; operations are at /orka/v1/");
+    serveText(404, R"({"error": {"code": "unknownOperation", "message": "not yet"}})");
+    EXPECT_EQ(sentence(newClient()->setContext(context("k"))),
+              "the provider at array.test:8443 does not serve /orka/v1/setContext: not yet");
+    EXPECT_EQ(code_, Wire::ErrorCode::UnknownOperation);
+}
+
 TEST_F(HttpsOperationTest, changesWhatTheArrayHolds) {
     VolumeSpec spec;
     spec.containerId = goldId;
