@@ -15,6 +15,7 @@
 #include "orka/ArrayFile.h"
 #include "orka/Embedded.h"
 #include "orka/Service.h"
+#include "orka/SystemReason.h"
 #include "orka/conformance/Bugs.h"
 #include "serve/Certificate.h"
 #include "serve/Misbehaviour.h"
@@ -162,7 +163,7 @@ kj::Own<kj::ConnectionReceiver> listenAt(kj::AsyncIoContext &io, std::string con
         return io.provider->getNetwork().parseAddress(address.c_str()).wait(io.waitScope)->listen();
     } catch (kj::Exception const &exception) {
         throw Wire::Failure(Wire::ErrorCode::IoError,
-                            fmt::format("cannot listen at {}: {}", address, exception.getDescription().cStr()));
+                            fmt::format("cannot listen at {}: {}", address, Orka::systemReason(exception)));
     }
 }
 

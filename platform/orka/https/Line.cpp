@@ -4,6 +4,8 @@
 #include <string_view>
 #include <utility>
 
+#include "orka/SystemReason.h"
+
 namespace Orka::Https {
 
 namespace {
@@ -13,23 +15,6 @@ constexpr kj::Duration idleTime = 4 * kj::SECONDS;
 constexpr std::size_t idleMax = 4;
 /// A lookup that has taken this long is given up for a new one.
 constexpr kj::Duration lookupTime = 60 * kj::SECONDS;
-
-/// What the system said, without what the library puts around it.
-std::string reasonOf(kj::Exception const &exception) {
-    std::string_view text(exception.getDescription().cStr());
-    for (std::string_view const mark : {"reason = ", "gai_strerror(status) = "}) {
-        if (auto const found = text.find(mark); found != std::string_view::npos) {
-            return std::string(text.substr(found + mark.size()));
-        }
-    }
-    if (auto const found = text.rfind(": "); found != std::string_view::npos) {
-        text.remove_prefix(found + 2);
-    }
-    if (auto const end = text.find("; "); end != std::string_view::npos) {
-        text = text.substr(0, end);
-    }
-    return std::string(text);
-}
 
 bool speaksOfTrust(kj::Exception const &exception) {
     return std::string_view(exception.getDescription().cStr()).find("certificate is not trusted") !=
@@ -61,22 +46,22 @@ Wire::Failure Line::unreachable(Step step, kj::Exception const &exception) {
     std::string sentence;
     switch (step) {
     case Step::LookingUp:
-        sentence = "the provider at " + authority_ + " cannot be found: " + reasonOf(exception);
+        sentence = "the provider at " + authority_ + " cannot be found: " + systemReason(exception);
         break;
     case Step::Connecting:
-        sentence = "the provider at " + authority_ + " cannot be reached: " + reasonOf(exception);
+        sentence = "the provider at " + authority_ + " cannot be reached: " + systemReason(exception);
         break;
     default:
         if (speaksOfTrust(exception)) {
             // Whoever mends the system's store is heard at the next try.
             trust_.forget();
-            auto const reason = reasonOf(exception);
+            auto const reason = systemReason(exception);
             sentence = "the provider at " + authority_ + " showed a certificate that is not trusted: " + reason;
             if (auto const advice = trust_.advice(); isOfAStranger(reason) && !advice.empty()) {
                 sentence += "; " + advice;
             }
         } else {
-            sentence = "the provider at " + authority_ + " did not agree on TLS: " + reasonOf(exception);
+            sentence = "the provider at " + authority_ + " did not agree on TLS: " + systemReason(exception);
         }
     }
     return {Wire::ErrorCode::ProviderUnreachable, sentence};

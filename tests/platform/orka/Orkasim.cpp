@@ -167,6 +167,12 @@ TEST_F(OrkasimTest, tellsWhatIsWrongWithTheWords) {
     }
 }
 
+TEST_F(OrkasimTest, tellsWhyItCannotListen) {
+    makeArray("x.array");
+    EXPECT_EQ(run({"serve", "--listen", "192.0.2.1:5", at("x.array")}), 1);
+    EXPECT_EQ(err_, "orkasim: cannot listen at 192.0.2.1:5: Cannot assign requested address\n");
+}
+
 TEST_F(OrkasimTest, helpsWhenAsked) {
     EXPECT_EQ(run({"--help"}), 0);
     EXPECT_EQ(out_, usage);
