@@ -3,6 +3,7 @@
 
 #include <exception>
 
+#include "FailureText.h"
 #include "gantry/Lib.h"
 #include "kestrel/Lib.h"
 #include "plexa/UsageError.h"
@@ -70,7 +71,7 @@ Outcome call(AutoCli::Command &command, boost::shared_ptr<CallSpec::Input> const
         outcome.message = mistake.sentence();
     } catch (std::exception const &failure) {
         outcome.status = ExitStatus::Failed;
-        outcome.message = failure.what();
+        outcome.message = textOf(failure);
     } catch (...) {
         outcome.status = ExitStatus::Failed;
         outcome.message = "the command failed with an exception of an unknown kind";

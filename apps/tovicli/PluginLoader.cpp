@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "ElfFile.h"
+#include "FailureText.h"
 #include "kestrel/Lib.h"
 
 namespace Tovicli {
@@ -28,7 +29,7 @@ std::string reasonOf(Call const &call) {
         call();
         return {};
     } catch (std::exception const &failure) {
-        return failure.what();
+        return textOf(failure);
     } catch (...) {
         return "an exception of an unknown kind";
     }

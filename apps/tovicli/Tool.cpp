@@ -3,6 +3,7 @@
 
 #include <exception>
 
+#include "FailureText.h"
 #include "Help.h"
 #include "Hints.h"
 
@@ -112,7 +113,7 @@ ExitStatus Tool::runReported(std::vector<std::string> const &arguments) {
         report_.fail(mistake.sentence(), std::nullopt, "try 'tovicli --help'");
         return ExitStatus::Usage;
     } catch (std::exception const &failure) { // memory, or a command that cannot even describe itself
-        report_.fail(failure.what());
+        report_.fail(textOf(failure));
         return ExitStatus::Failed;
     }
 }

@@ -7,6 +7,7 @@
 #include <capnp/serialize-async.h>
 #include <fmt/format.h>
 
+#include "Broken.h"
 #include "Escape.h"
 #include "RequestCheck.h"
 #include "wire/Limits.h"
@@ -48,12 +49,6 @@ struct Deadlines {
         end = now + whole - margin / 2;
     }
 };
-
-Failure failureOf(kj::Exception const &exception) {
-    bool const isMemory = exception.getType() == kj::Exception::Type::OVERLOADED;
-    return Failure(isMemory ? ErrorCode::OutOfMemory : ErrorCode::InternalError,
-                   fmt::format("the daemon failed: {}", exception.getDescription().cStr()));
-}
 
 } // namespace
 
@@ -135,7 +130,9 @@ kj::Promise<void> Connection::answer() {
 Answer<ReplyPtr> Connection::handle(Wire::Request::Reader request, CallPtr const &call, kj::TimePoint end) {
     auto handled = kj::evalNow([&] {
                        return dispatch(core_, call, request);
-                   }).catch_([](kj::Exception &&exception) -> Outcome<ReplyPtr> { return failureOf(exception); });
+                   }).catch_([](kj::Exception &&exception) -> Outcome<ReplyPtr> {
+        return brokenBy(exception, "the request failed");
+    });
     auto tooLate = core_.timer.atTime(end).then([]() -> Outcome<ReplyPtr> {
         return Failure(ErrorCode::DeadlineExceeded, "the daemon did not finish the request before its deadline");
     });

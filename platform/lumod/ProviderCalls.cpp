@@ -5,6 +5,8 @@
 
 #include <fmt/format.h>
 
+#include "Broken.h"
+
 namespace Lumod {
 
 using Wire::ErrorCode;
@@ -15,12 +17,6 @@ namespace {
 bool isChange(Operation operation) {
     return operation == Operation::CreateVirtualVolume || operation == Operation::DeleteVirtualVolume ||
            operation == Operation::BindVirtualVolume || operation == Operation::UnbindVirtualVolume;
-}
-
-/// A defect or a fault of the machine, told as what it is.
-Failure internalError(kj::Exception const &exception, std::string const &provider, Operation operation) {
-    return Failure(ErrorCode::InternalError, fmt::format("{} of provider '{}' broke: {}", nameOf(operation), provider,
-                                                         exception.getDescription().cStr()));
 }
 
 } // namespace
@@ -66,7 +62,7 @@ Answer<T> ProviderCalls::perform(Operation operation, Function &&function) const
     auto promise = attempt([&] { return function(*entry_->provider, contextFor(operation)); });
     return promise
         .catch_([operation, entry = entry_](kj::Exception &&exception) -> Result {
-            return internalError(exception, entry->record.name, operation);
+            return brokenBy(exception, fmt::format("{} of provider '{}' broke", nameOf(operation), entry->record.name));
         })
         .then([operation, entry = entry_, call = call_, &log](Result &&result) -> Result {
             if (!result.ok()) {

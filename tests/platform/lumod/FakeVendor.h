@@ -5,6 +5,7 @@
 // that change.
 #pragma once
 
+#include <functional>
 #include <map>
 #include <memory>
 #include <set>
@@ -27,6 +28,7 @@ struct FakeVendor {
     std::vector<std::string> calls; ///< "operation argument ..."
     std::vector<Orka::CallContext> contexts;
     std::map<std::string, Wire::Failure> failing; ///< by operation
+    std::function<void()> breaks;                 ///< called by every operation; throws what no provider should
     bool swallowsAnswers = false;                 ///< tells of one volume less than it was asked about
     std::set<std::string> hanging;                ///< operations that wait for answer()
     std::vector<kj::Own<kj::PromiseFulfiller<void>>> held;
@@ -202,6 +204,9 @@ private:
         vendor_->calls.push_back(arguments.empty() ? operation : operation + " " + arguments);
         vendor_->contexts.push_back(context);
         auto now = [vendor = vendor_, operation, function]() -> Orka::Outcome<T> {
+            if (vendor->breaks) {
+                vendor->breaks();
+            }
             auto const failure = vendor->failing.find(operation);
             if (failure != vendor->failing.end()) {
                 return failure->second;

@@ -34,6 +34,25 @@ TEST_F(StorageContainersTest, NoStoreMeansNoContainers) {
     EXPECT_FALSE(std::ifstream(store_.path()).good()) << "the daemon must not make the store";
 }
 
+TEST_F(StorageContainersTest, fault_62_WhatBreaksIsAFailureInWords) {
+    auto const vendor = addUsualVendor();
+    vendor->hanging = {"queryStorageArray"};
+    auto const asked = [&] {
+        Pending pending = start(getAll);
+        scope_.poll();
+        vendor->answer();
+        return finish(std::move(pending));
+    };
+    vendor->breaks = [] { throw std::bad_alloc(); };
+    Reply const exhausted = asked();
+    EXPECT_EQ(exhausted.code(), ErrorCode::OutOfMemory);
+    EXPECT_EQ(exhausted.sentence(), "queryStorageArray of provider 'vp' broke: the daemon is out of memory");
+    vendor->breaks = [] { throw std::runtime_error("a defect"); };
+    Reply const defective = asked();
+    EXPECT_EQ(defective.code(), ErrorCode::InternalError);
+    EXPECT_THAT(defective.sentence(), testing::HasSubstr("a defect"));
+}
+
 TEST_F(StorageContainersTest, AProviderWithoutArraysInItsRecordServesAllThatItExports) {
     auto const vendor = addUsualVendor();
     vendor->arrays.push_back(arrayOf("a2", {}));

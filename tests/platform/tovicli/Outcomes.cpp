@@ -105,6 +105,7 @@ Case const cases[] = {
      LastFailure{10, "no daemon answers at /r/run/lumod.sock", "r"}, 3, "",
      "tovicli: Unable to initialize lumoLib: no daemon answers at /r/run/lumod.sock (start it with 'lumod --root "
      "/r')\n"},
+    {"memory", [](Output &) { throw std::bad_alloc(); }, {}, 1, "", "tovicli: out of memory\n"},
     {"any other exception", [](Output &) { throw std::runtime_error("what"); }, {}, 1, "", "tovicli: what\n"},
     {"no exception of the library's",
      [](Output &) { throw 7; },
