@@ -75,3 +75,14 @@ kill_daemon() {
     lumo configlumo add -n vm -c "$container"
     expect_done $'true\n'
 }
+
+@test "a topology that is none brings nothing up and leaves nothing behind" {
+    mkdir "$BATS_TEST_TMPDIR/temporary"
+    echo '{' >"$BATS_TEST_TMPDIR/bad.json"
+    status=0
+    TMPDIR="$BATS_TEST_TMPDIR/temporary" "$top/lab/up" --topology "$BATS_TEST_TMPDIR/bad.json" >"$out" 2>"$err" || status=$?
+    expect_status 1
+    expect_out ""
+    grep -q 'bad.json: line 2, column 1: Missing a name for object member.' "$err"
+    [ -z "$(ls -A "$BATS_TEST_TMPDIR/temporary")" ]
+}
