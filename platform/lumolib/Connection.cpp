@@ -59,7 +59,8 @@ Failure connectFailure(int error, std::string const &path, std::chrono::millisec
 
 /// What the daemon answered instead of a result. Its sentence is for the user as it stands.
 Failure answered(Compact::FailureReply::Reader failure) {
-    std::string_view const sentence = failure.getSentence();
+    std::string_view const told = failure.getSentence();
+    std::string_view const sentence = told.substr(0, told.find('\0')); // all that callers in C would see
     char const *general = Wire::textOf(failure.getCode());
     if (sentence.size() > 0) {
         return Failure(static_cast<ErrorCode>(failure.getCode()), std::string(sentence));
@@ -233,7 +234,7 @@ std::optional<Failure> Connection::partingWords(Wire::Deadline deadline) {
     try {
         if (Compact::receive(socket_.get(), received_, Wire::replyBytesMax, deadline)) {
             Compact::Reply::Reader const reply = received_.getRoot<Compact::Reply>();
-            if (reply.isFailure() && reply.getId() == 0) {
+            if (reply.isFailure() && reply.getId() == 0 && reply.getFailure().getCode() != 0) {
                 return answered(reply.getFailure());
             }
         }

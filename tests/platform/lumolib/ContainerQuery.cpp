@@ -188,6 +188,17 @@ TEST_F(ContainerQuery, a_failure_hands_out_nothing_and_tells_the_particular_sent
     EXPECT_EQ(lastFailure(), "31: the provider vp is offline");
 }
 
+TEST_F(ContainerQuery, a_failure_whose_sentence_says_nothing_gets_the_general_one) {
+    for (std::string const &sentence : {std::string(), std::string("\0hidden", 7)}) {
+        query([&](Wire::Request::Reader request, Peer &peer) {
+            peer.failure(request.getId(), code(ErrorCode::ProviderOffline), sentence);
+        });
+        EXPECT_STREQ(LumoLib_ErrorExStr(&error_), Wire::textOf(code(ErrorCode::ProviderOffline)));
+        LumoLib_Exit();
+        daemon_.reset();
+    }
+}
+
 TEST_F(ContainerQuery, a_failure_after_some_chunks_hands_out_nothing_and_keeps_the_connection) {
     int requests = 0;
     StorageContainerResult *result = query([&requests](Wire::Request::Reader request, Peer &peer) {

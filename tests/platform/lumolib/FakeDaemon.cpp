@@ -55,7 +55,7 @@ void Peer::failure(std::uint64_t id, std::int32_t code, std::string const &sente
     reply(id, [&](Wire::Reply::Builder reply) {
         Wire::FailureReply::Builder failure = reply.initFailure();
         failure.setCode(code);
-        failure.setSentence(sentence.c_str());
+        failure.setSentence(capnp::Text::Reader(sentence.c_str(), sentence.size()));
     });
 }
 
