@@ -234,6 +234,10 @@ kj::Promise<kj::Own<kj::AsyncIoStream>> Trust::secure(kj::Own<kj::AsyncIoStream>
     return kj::mv(stream);
 }
 
+std::string Trust::advice() const {
+    return "";
+}
+
 } // namespace Orka::Https
 
 int LLVMFuzzerTestOneInput(std::uint8_t const *data, std::size_t size) {

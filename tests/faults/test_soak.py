@@ -35,7 +35,9 @@ class Marks:
         for name in self.processes:
             told = [mark[name] for mark in self.taken]
             test.assertLess(told[-1][0] - told[0][0], room, f"{name}: {told}")
-            test.assertLessEqual(max(count for _, count in told), told[0][1], f"{name}: {told}")
+            # A connection that was closed a moment ago may still be open at its other end.
+            test.assertLessEqual(max(count for _, count in told), told[0][1] + 1, f"{name}: {told}")
+            test.assertLessEqual(min(count for _, count in told[2:]), told[0][1], f"{name}: {told}")
 
 
 class LumoErrorEx(ctypes.Structure):
