@@ -158,7 +158,7 @@ class Views(unittest.TestCase):
         def refused(status, text, *words):
             told = subprocess.run([TOP / "lab/up", "--build", build(), "--root", self.fleet.directory / "d", *words],
                                   check=False, capture_output=True, text=True)
-            self.assertEqual((told.returncode, told.stdout), (status, ""), told.stderr)
+            self.assertEqual((told.returncode, told.stdout), (status, "false\n"), told.stderr)
             self.assertIn(text, told.stderr)
 
         refused(1, "no orkasim serves the array of ", "--beside", self.b.root)
