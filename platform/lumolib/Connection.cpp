@@ -62,7 +62,7 @@ Failure answered(Compact::FailureReply::Reader failure) {
     std::string_view const told = failure.getSentence();
     std::string_view const sentence = told.substr(0, told.find('\0')); // all that callers in C would see
     char const *general = Wire::textOf(failure.getCode());
-    if (sentence.size() > 0) {
+    if (!sentence.empty()) {
         return Failure(static_cast<ErrorCode>(failure.getCode()), std::string(sentence));
     }
     return Failure(static_cast<ErrorCode>(failure.getCode()), general != nullptr ? general : "unknown error");

@@ -16,8 +16,9 @@ template <typename Result, typename... Arguments>
 class FunctionRef<Result(Arguments...)> {
 public:
     template <typename Function>
-    requires(!std::is_same_v<std::remove_cvref_t<Function>, FunctionRef>)
-        FunctionRef(Function &&function) // NOLINT(google-explicit-constructor): a lambda is handed over as it is
+    // A lambda is handed over as it is; a copy of this class is no Function.
+    // NOLINTNEXTLINE(bugprone-forwarding-reference-overload)
+    requires(!std::is_same_v<std::remove_cvref_t<Function>, FunctionRef>) FunctionRef(Function &&function)
         : function_(const_cast<void *>(static_cast<void const *>(std::addressof(function))))
         , call_([](void *place, Arguments... arguments) -> Result {
             return (*static_cast<std::remove_reference_t<Function> *>(place))(std::forward<Arguments>(arguments)...);
