@@ -211,7 +211,7 @@ class Profile(unittest.TestCase):
                           "kernel: the rest": 10000})
 
     def test_page_faults_are_counted_by_whose_page_it_is(self):
-        text = ("    56053a1a5400 __TMC_END__ (/work/bin/tovicli) ffffffff8175336a elf_load ([kernel.kallsyms])\n"
+        text = ("    56053a1a5400 __TMC_END__ (/opt/bin/tovicli) ffffffff8175336a elf_load ([kernel.kallsyms])\n"
                 "    7f063ec9a120 guard for f()::x (/lib/libplexa.so.1.0.0)     7f063ecc6920 memset (/usr/lib/ld-linux-x86-64.so.2)\n"
                 "    7ffca5f6ca09 [unknown] ([stack]) ffffffff81b73c18 _copy_to_user ([kernel.kallsyms])\n"
                 "    7f063ec9b008 [unknown] (//anon)     7f063ecab23e _dl_init_paths (/usr/lib/ld-linux-x86-64.so.2)\n")
