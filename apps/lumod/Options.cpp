@@ -3,7 +3,6 @@
 
 #include <array>
 #include <charconv>
-#include <limits>
 #include <string_view>
 #include <utility>
 #include <vector>
@@ -13,6 +12,7 @@
 
 #include <fmt/format.h>
 
+#include "lumod/Daemon.h"
 #include "wire/Failure.h"
 
 namespace {
@@ -52,15 +52,14 @@ Lumod::LogLevel levelOf(std::string_view from, std::string_view word) {
     return *level;
 }
 
-constexpr int64_t longestPeriodUs = std::numeric_limits<int32_t>::max() * int64_t{1000};
-
 int64_t periodOf(std::string_view text) {
     int64_t microseconds = 0;
     auto const end = text.data() + text.size();
     auto const parsed = std::from_chars(text.data(), end, microseconds);
-    if (parsed.ec != std::errc() || parsed.ptr != end || microseconds <= 0 || microseconds > longestPeriodUs) {
+    if (parsed.ec != std::errc() || parsed.ptr != end || microseconds <= 0 ||
+        microseconds > Lumod::longestUnbindPeriodUs) {
         refuse(fmt::format("--unbind-period: '{}' is no period; expected a number of microseconds from 1 to {}", text,
-                           longestPeriodUs));
+                           Lumod::longestUnbindPeriodUs));
     }
     return microseconds;
 }

@@ -14,6 +14,7 @@
 #include <rapidjson/memorystream.h>
 
 #include "Property.h"
+#include "SetField.h"
 #include "plexa/Formatter.h"
 #include "plexa/JsonText.h"
 #include "plexa/Text.h"
@@ -23,6 +24,7 @@ namespace {
 
 using namespace Plexa;
 using namespace Plexa::MetaObj;
+using FormatCases::setField;
 using Fuzz::require;
 using Object = boost::shared_ptr<MetaObject>;
 
@@ -32,18 +34,6 @@ constexpr std::size_t longestText = 60;
 template <typename Value>
 boost::shared_ptr<Value> as(Object const &object) {
     return boost::dynamic_pointer_cast<Value>(object);
-}
-
-void setField(MetaStruct &structure, std::string const &field, Object const &value) {
-    if (auto const list = as<MetaList>(value)) {
-        structure.SetField(field, list);
-    } else if (auto const text = as<MetaString>(value)) {
-        structure.SetField(field, text);
-    } else if (auto const number = as<MetaInt>(value)) {
-        structure.SetField(field, number);
-    } else if (auto const truth = as<MetaBool>(value)) {
-        structure.SetField(field, truth);
-    }
 }
 
 Object valueFrom(FuzzedDataProvider &input, unsigned depth) {

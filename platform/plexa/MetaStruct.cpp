@@ -96,7 +96,7 @@ void MetaStruct::Store(std::string const &field, boost::shared_ptr<MetaObject> v
         }
     }
     if (fields_.empty()) {
-        fields_.reserve(2); // few structures have less; a long list then makes half as many allocations
+        fields_.reserve(2); // few structures have fewer; a long list then makes half as many allocations
     }
     fields_.push_back({field, std::move(value)});
 }

@@ -5,10 +5,7 @@
 load helper
 
 setup() {
-    memory=/dev/shm
-    [ -w "$memory" ] || memory="$BATS_TEST_TMPDIR"
-    place="$(mktemp -d -p "$memory")"
-    orkasim make "$top/lab/topologies/small.json" "$place/test.array"
+    array_in_memory
     # shellcheck disable=SC2016  # the backquotes are Markdown's
     orka-conformance --list-bugs --format markdown |
         sed -n 's/^| `\(.*\)` | .* | `\(.*\)` | \(yes\|no\).* |$/\1 \2 \3/p' >"$place/bugs"

@@ -5,11 +5,7 @@
 load helper
 
 setup() {
-    # Thousands of commits: in memory where there is a place for them.
-    memory=/dev/shm
-    [ -w "$memory" ] || memory="$BATS_TEST_TMPDIR"
-    place="$(mktemp -d -p "$memory")"
-    orkasim make "$top/lab/topologies/small.json" "$place/test.array"
+    array_in_memory
 }
 
 teardown() {

@@ -29,6 +29,14 @@ host_up() {
     eval "$settings"
 }
 
+# array_in_memory: $place, a directory for an array that takes thousands of commits: in memory where there is room for it.
+array_in_memory() {
+    local memory=/dev/shm
+    [ -w "$memory" ] || memory="$BATS_TEST_TMPDIR"
+    place="$(mktemp -d -p "$memory")"
+    orkasim make "$top/lab/topologies/small.json" "$place/test.array"
+}
+
 # needs_file_url: leaves a test out whose array is behind orkasim, since it is about URLs of files.
 needs_file_url() {
     [ "${TOVI_LAB_HTTPS:-}" != 1 ] || skip "of an array file that lumod opens itself"

@@ -153,7 +153,6 @@ class Views(unittest.TestCase):
         self.assertNotEqual(self.fleet.bound()["vm"], first)
         self.assertEqual(self.a.statuses("gold")[self.uuid("vm")], "accessible")
 
-
     def test_a_host_is_brought_up_beside_one_that_is_up_with_https_only(self):
         def refused(status, text, *words):
             told = subprocess.run([TOP / "lab/up", "--build", build(), "--root", self.fleet.directory / "d", *words],

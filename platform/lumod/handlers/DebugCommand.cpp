@@ -9,14 +9,11 @@ namespace Lumod {
 
 namespace {
 
-/// A year. What is far longer is past the end of the daemon's clock.
-constexpr int64_t longestPeriodUs = int64_t{365} * 24 * 3600 * 1000 * 1000;
-
 int64_t requestedPeriod(int64_t microseconds) {
-    if (microseconds > longestPeriodUs) {
+    if (microseconds > longestUnbindPeriodUs) {
         throw Wire::Failure(Wire::ErrorCode::InvalidArgument,
                             fmt::format("{} us is longer than an unbind period may be; the longest is {} us, a year",
-                                        microseconds, longestPeriodUs));
+                                        microseconds, longestUnbindPeriodUs));
     }
     return microseconds;
 }

@@ -5,6 +5,7 @@
 // have thousands of lists on their way. What was not asked for the longest goes first.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <functional>
 #include <list>
@@ -13,6 +14,7 @@
 #include <string_view>
 #include <typeindex>
 #include <unordered_map>
+#include <utility>
 #include <vector>
 
 namespace Orka::Https {
@@ -61,22 +63,20 @@ private:
         Pages pages;
     };
 
-    /// A content that is kept already and is the same; null when there is none.
+    /// A content that is kept already and is the same; null when there is none. The newest are looked at first: who
+    /// asks at the same moment is told the same.
     template <typename T>
     std::shared_ptr<Content const> same(std::shared_ptr<std::vector<T> const> const &items) const {
         Content const *compared = nullptr;
-        for (List const &list : lists_) {
+        auto const found = std::find_if(lists_.rbegin(), lists_.rend(), [&](List const &list) {
             // Neighbours mostly share theirs, and need no second look.
-            if (list.content.get() == compared) {
-                continue;
+            if (list.content.get() == std::exchange(compared, list.content.get())) {
+                return false;
             }
-            compared = list.content.get();
-            if (compared->type == typeid(T) && compared->elements == items->size() &&
-                (compared->items == items || *static_cast<std::vector<T> const *>(compared->items.get()) == *items)) {
-                return list.content;
-            }
-        }
-        return nullptr;
+            return compared->type == typeid(T) && compared->elements == items->size() &&
+                   (compared->items == items || *static_cast<std::vector<T> const *>(compared->items.get()) == *items);
+        });
+        return found == lists_.rend() ? nullptr : found->content;
     }
 
     void add(List list);

@@ -5,6 +5,7 @@
 // states, fault rules, endpoint events, volumes waiting to be unbound) is in memory, and a restart forgets it.
 #pragma once
 
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <string>
@@ -16,6 +17,9 @@
 #include "orka/Provider.h"
 
 namespace Lumod {
+
+/// A year. What is far longer is past the end of the daemon's clock.
+constexpr int64_t longestUnbindPeriodUs = int64_t{365} * 24 * 3600 * 1000 * 1000;
 
 struct Settings {
     std::string root;

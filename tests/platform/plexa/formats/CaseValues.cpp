@@ -3,6 +3,8 @@
 
 #include <array>
 
+#include "SetField.h"
+
 namespace FormatCases {
 
 using namespace Plexa::MetaObj;
@@ -20,18 +22,6 @@ std::string every(unsigned first, unsigned last) {
 template <typename Value>
 boost::shared_ptr<Value> as(Object const &object) {
     return boost::dynamic_pointer_cast<Value>(object);
-}
-
-void setField(MetaStruct &structure, std::string const &field, Object const &value) {
-    if (auto const list = as<MetaList>(value)) {
-        structure.SetField(field, list);
-    } else if (auto const text = as<MetaString>(value)) {
-        structure.SetField(field, text);
-    } else if (auto const number = as<MetaInt>(value)) {
-        structure.SetField(field, number);
-    } else if (auto const truth = as<MetaBool>(value)) {
-        structure.SetField(field, truth);
-    }
 }
 
 unsigned below(std::mt19937 &generator, unsigned limit) {
