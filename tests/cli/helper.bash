@@ -39,7 +39,17 @@ array_in_memory() {
 
 # needs_file_url: leaves a test out whose array is behind orkasim, since it is about URLs of files.
 needs_file_url() {
-    [ "${TOVI_LAB_HTTPS:-}" != 1 ] || skip "of an array file that lumod opens itself"
+    [ "${TOVI_LAB_HTTPS:-}" != 1 ] || skip "left to another run: of an array file that lumod opens itself"
+}
+
+# needs_no_sanitizer WHY: leaves a test out that cannot hold where the programs are built under sanitizers.
+needs_no_sanitizer() {
+    [ "${TOVI_SANITIZED:-}" != 1 ] || skip "left to another run: $1"
+}
+
+# traced OPTIONS... PROGRAM...: strace of a program. Where the programs look for leaks, a traced one cannot.
+traced() {
+    ASAN_OPTIONS="${ASAN_OPTIONS:+$ASAN_OPTIONS:}detect_leaks=0" strace "$@"
 }
 
 # host_down: stops this test's lumod, if it runs; the root stays for whoever looks into a failure.

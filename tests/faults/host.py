@@ -12,9 +12,11 @@ import shutil
 import signal
 import sqlite3
 import subprocess
+import sys
 import tempfile
 
 TOP = pathlib.Path(__file__).resolve().parent.parent.parent
+sys.path.append(str(TOP / "tests"))  # suite.py, for whoever imports this
 GOLD = "3f1a52de-6c1b-4b57-9a0e-2d8c7e5b9001"
 ARCHIVE = "3f1a52de-6c1b-4b57-9a0e-2d8c7e5b9003"
 SETTINGS = ("TOVI_ROOT", "TOVI_OFFLINE", "TOVI_TIMEOUT_MS", "TOVI_REQUEST_ID", "TOVI_LOG_LEVEL")

@@ -13,6 +13,7 @@ import unittest
 
 import wire
 from host import GOLD, TOP, Host, programs
+import suite
 
 LONG = bool(os.environ.get("TOVI_LONG"))
 MIB = 1 << 20
@@ -64,14 +65,14 @@ class Crowds(unittest.TestCase):
             client.send(request)
             client.messages(21)
         # The flooder holds one request and one reply message, however much more it sends.
-        self.assertLess(resident(pid) - before, 16 * MIB)
+        self.hold(resident(pid) - before, 16 * MIB)
         # So do those who ask and do not read: not their whole answers, which would be 3.4 GiB.
         for client in clients[21:]:
             client.send(request)
         probe = wire.Client(box)
         probe.send(request)
         probe.messages(21)
-        self.assertLess(resident(pid) - before, 1000 * MIB // 2)
+        self.hold(resident(pid) - before, 1000 * MIB // 2)
         began = time.monotonic()
         listed = box.lumo("storagecontainer", "add", "--container-name", "x", "--container-id", "x")
         self.assertEqual(listed.status, 1, listed)
@@ -99,11 +100,17 @@ class Crowds(unittest.TestCase):
                 self.answers(box, read, batch, 2 * batch if done % (10 * batch) else batch)
             self.answers(box, read, 1, 2)
             marks.append((resident(pid), descriptors(pid)))
-            self.assertLess(marks[-1][0] - marks[0][0], MIB, marks)
+            self.hold(marks[-1][0] - marks[0][0], MIB, marks)
             # The last of those who left may not have been noticed yet.
             self.assertLessEqual(marks[-1][1], marks[0][1] + 2, marks)
             self.assertEqual(box.stop(), 0)
 
+    def hold(self, grown, room, told=None):
+        """The daemon has grown by less than that. What sanitizers keep for themselves is not the daemon's."""
+        if not suite.SANITIZED:
+            self.assertLess(grown, room, told)
+
+    @suite.left_unless(not suite.SANITIZED, "a sanitizer opens a pipe to look at an object, and takes a refusal for a fault")
     def test_fault_62_a_tool_without_descriptors(self):
         with Host() as box:
             self.serve(box)
@@ -126,4 +133,4 @@ class Crowds(unittest.TestCase):
 
 
 if __name__ == "__main__":
-    unittest.main()
+    suite.main()

@@ -12,6 +12,7 @@ import unittest
 
 import sweep
 from host import GOLD, TOP, Host, programs
+import suite
 
 LONG = bool(os.environ.get("TOVI_LONG"))
 VOLUME = ("-n", "vm", "-c", GOLD)
@@ -152,19 +153,19 @@ class DaemonSweep(unittest.TestCase):
     def test_fault_47_refused_while_it_creates(self):
         self.fail_everywhere("create")
 
-    @unittest.skipUnless(LONG, "takes long")
+    @suite.left_unless(LONG, "takes long")
     def test_fault_27_killed_while_it_binds(self):
         self.kill_everywhere("bind")
 
-    @unittest.skipUnless(LONG, "takes long")
+    @suite.left_unless(LONG, "takes long")
     def test_fault_27_killed_while_it_deletes(self):
         self.kill_everywhere("delete")
 
-    @unittest.skipUnless(LONG, "takes long")
+    @suite.left_unless(LONG, "takes long")
     def test_fault_47_refused_while_it_binds(self):
         self.fail_everywhere("bind")
 
-    @unittest.skipUnless(LONG, "takes long")
+    @suite.left_unless(LONG, "takes long")
     def test_fault_47_refused_while_it_deletes(self):
         self.fail_everywhere("delete")
 
@@ -207,4 +208,4 @@ class MakerSweep(unittest.TestCase):
 
 
 if __name__ == "__main__":
-    unittest.main()
+    suite.main()

@@ -11,6 +11,7 @@ import sys
 import unittest
 
 from host import GOLD, Host
+import suite
 
 UNSHARE = ["unshare", "--map-root-user", "--mount", "--propagation", "private"]
 INSIDE = "TOVI_INSIDE"
@@ -88,9 +89,9 @@ class Disk(unittest.TestCase):
 
 if __name__ == "__main__":
     if os.environ.get(INSIDE):
-        unittest.main()
+        suite.main()
     if subprocess.run([*UNSHARE, "true"], check=False, capture_output=True).returncode != 0:
         print("skipped: this kernel gives no mount namespace to this user")
-        sys.exit(77)
+        sys.exit(suite.SKIPPED)
     sys.exit(subprocess.run([*UNSHARE, sys.executable, __file__, *sys.argv[1:]], check=False,
                             env={**os.environ, INSIDE: "1"}).returncode)

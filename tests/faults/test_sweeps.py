@@ -12,6 +12,7 @@ import unittest
 
 import sweep
 from host import ARCHIVE, GOLD, Host, programs
+import suite
 
 LONG = bool(os.environ.get("TOVI_LONG"))
 VOLUME = ("-n", "vm", "-c", GOLD)
@@ -204,4 +205,4 @@ class Fault47RefusedAtEveryCall(Errors):
 
 
 if __name__ == "__main__":
-    unittest.main()
+    suite.main()

@@ -12,6 +12,7 @@ import unittest
 
 import sweep
 from host import GOLD, TOP, Host, programs
+import suite
 
 UNITS = TOP / "apps/lumod/systemd"
 ANALYZE = shutil.which("systemd-analyze")
@@ -113,4 +114,4 @@ class Units(unittest.TestCase):
 
 
 if __name__ == "__main__":
-    unittest.main()
+    suite.main()

@@ -13,10 +13,12 @@ import shutil
 import signal
 import sqlite3
 import subprocess
+import sys
 import tempfile
 import threading
 
 TOP = pathlib.Path(__file__).resolve().parent.parent.parent
+sys.path.append(str(TOP / "tests"))  # suite.py, for whoever imports this
 NAMES = ("a", "b", "c")
 CONTAINERS = {"gold": "3f1a52de-6c1b-4b57-9a0e-2d8c7e5b9001",
               "silver": "3f1a52de-6c1b-4b57-9a0e-2d8c7e5b9002",

@@ -12,6 +12,7 @@ import time
 import unittest
 
 from fleet import CONTAINERS, Fleet
+import suite
 
 LONG = os.environ.get("TOVI_LONG") == "1"
 WORKERS = 2  # a host
@@ -182,7 +183,7 @@ class Load(unittest.TestCase):
         self.assertEqual(self.fleet.everything(), self.before)
 
 
-@unittest.skipUnless(LONG, "takes long")
+@suite.left_unless(LONG, "takes long")
 class LoadOnAFile(Load):
     """The same, with the array's file open in each daemon and nobody in between."""
 
@@ -191,4 +192,4 @@ class LoadOnAFile(Load):
 
 
 if __name__ == "__main__":
-    unittest.main()
+    suite.main()

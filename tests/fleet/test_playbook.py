@@ -10,6 +10,7 @@ import subprocess
 import unittest
 
 from fleet import CONTAINERS, NAMES, TOP, Fleet, build, kill
+import suite
 
 LONG = os.environ.get("TOVI_LONG") == "1"
 PLAYBOOK = shutil.which("ansible-playbook")
@@ -52,7 +53,7 @@ class Playbook(unittest.TestCase):
         listed = self.play("--list-hosts")
         self.assertEqual(sorted(listed.out.partition("hosts (3):")[2].split()), sorted(NAMES), listed.out)
 
-    @unittest.skipUnless(LONG, "takes long")
+    @suite.left_unless(LONG, "takes long")
     def test_it_does_what_is_missing_and_nothing_else(self):
         first = self.play()
         self.assertEqual((first.status, first.of("failed")), (0, dict.fromkeys(NAMES, 0)), first.out)
@@ -69,7 +70,7 @@ class Playbook(unittest.TestCase):
         third = self.play()
         self.assertEqual((third.status, third.of("changed")), (0, {"a": 0, "b": 2, "c": 0}), third.out)
 
-    @unittest.skipUnless(LONG, "takes long")
+    @suite.left_unless(LONG, "takes long")
     def test_a_host_that_fails_fails_alone_and_in_one_line(self):
         first, dead, cut_off = self.fleet.hosts
         kill(int((dead.root / "run/lumod.pid").read_text()))
@@ -91,4 +92,4 @@ class Playbook(unittest.TestCase):
 
 
 if __name__ == "__main__":
-    unittest.main()
+    suite.main()
