@@ -38,7 +38,7 @@ setup() {
 @test "no other command loads the library of these, nor what it needs" {
     for command in "--version" "--help" "storage internal lumo orkacontext set --clear"; do
         # shellcheck disable=SC2086  # words on purpose
-        strace -f -e trace=openat -o "$BATS_TEST_TMPDIR/opened" tovicli $command >/dev/null 2>&1
+        traced -f -e trace=openat -o "$BATS_TEST_TMPDIR/opened" tovicli $command >/dev/null 2>&1
         grep -q libplexa "$BATS_TEST_TMPDIR/opened"
         run ! grep -E "libtovicli-|libedit|libtinfo|libbsd" "$BATS_TEST_TMPDIR/opened"
     done
@@ -47,7 +47,7 @@ setup() {
 }
 
 @test "the library of line editing is loaded by a shell on a terminal only" {
-    strace -f -e trace=openat -o "$BATS_TEST_TMPDIR/opened" tovicli cli shell </dev/null
+    traced -f -e trace=openat -o "$BATS_TEST_TMPDIR/opened" tovicli cli shell </dev/null
     grep -q libtovicli-cli "$BATS_TEST_TMPDIR/opened"
     run ! grep -E "libtovicli-lines|libedit" "$BATS_TEST_TMPDIR/opened"
 }

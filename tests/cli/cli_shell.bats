@@ -129,7 +129,7 @@ assert [len(d) for d in documents] == [3, 0, 1], documents' "$out"
     for ((i = 0; i < 20; i++)); do
         echo "$lumo daemon set --log-level info"
     done >"$BATS_TEST_TMPDIR/lines"
-    strace -f -e trace=connect,execve -o "$BATS_TEST_TMPDIR/trace" tovicli cli shell <"$BATS_TEST_TMPDIR/lines" >"$out"
+    traced -f -e trace=connect,execve -o "$BATS_TEST_TMPDIR/trace" tovicli cli shell <"$BATS_TEST_TMPDIR/lines" >"$out"
     [ "$(grep -c true "$out")" -eq 20 ]
     [ "$(grep -c 'connect(' "$BATS_TEST_TMPDIR/trace")" -eq 1 ]
     [ "$(grep -c 'execve(' "$BATS_TEST_TMPDIR/trace")" -eq 1 ]

@@ -133,7 +133,7 @@ END
 }
 
 @test "a file system that tells of a lost write on closing only is believed" {
-    strace -qq -o /dev/null -P "$out" -e trace=close -e inject=close:error=EDQUOT:when=1 \
+    traced -qq -o /dev/null -P "$out" -e trace=close -e inject=close:error=EDQUOT:when=1 \
         tovicli storage internal lumo orkacontext set --uuid 0123-4567 >"$out" 2>"$err" || status=$?
     expect_status 4
     expect_err_has "cannot write the output: Disk quota exceeded" "the command itself was completed"
