@@ -151,7 +151,10 @@ Inventory ArrayFile::inventory() {
 std::optional<std::string> ArrayFile::hostContext() {
     return onFile([&] {
         auto row = database_->query("SELECT context FROM host_context");
-        return row.step() ? optionalText(row, 0) : std::nullopt;
+        if (!row.step()) {
+            failDamaged(*database_, "it has no place for the host's context"); // an update would go nowhere
+        }
+        return optionalText(row, 0);
     });
 }
 

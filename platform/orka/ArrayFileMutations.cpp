@@ -134,7 +134,10 @@ VirtualVolume ArrayFile::createVolume(std::string const &idempotencyKey, VolumeS
                                                 spec.directoryName, std::to_string(spec.sizeMb),
                                                 spec.profile ? "profile" : "", spec.profile.value_or(""), spec.vmUuid});
         Sqlite::Transaction transaction(*database_);
-        if (auto const before = recall(*database_, idempotencyKey, request); before && before->created) {
+        if (auto const before = recall(*database_, idempotencyKey, request)) {
+            if (!before->created) {
+                failDamaged(*database_, "the answer to an earlier request names no virtual volume");
+            }
             return volumeAsCreated(spec, *before->created);
         }
         auto const container = requireContainer(*database_, spec.containerId);

@@ -18,6 +18,7 @@ protected:
             file.configVolumes(goldId, 10);
             file.unsharedChunks(goldId, webId);
             file.boundVolumes();
+            file.hostContext();
             VolumeSpec spec;
             spec.containerId = goldId;
             spec.directoryName = "new";
@@ -45,6 +46,18 @@ TEST_F(HostileArrayFile, fault_48_withATriggerIsRefused) {
               "it holds something that does not belong there");
 }
 
+TEST_F(HostileArrayFile, fault_48_withAStatementThatMakesNothingIsRefused) {
+    EXPECT_EQ(damage("UPDATE sqlite_schema SET sql = '' WHERE name = 'sqlite_autoindex_volume_1'"),
+              "it holds something that does not belong there");
+}
+
+TEST_F(HostileArrayFile, fault_48_withATableTwiceIsRefused) {
+    EXPECT_EQ(damage("INSERT INTO sqlite_schema SELECT * FROM sqlite_schema WHERE name = 'metadata'"),
+              "malformed database schema (metadata) - table metadata already exists");
+    EXPECT_EQ(damage("DELETE FROM sqlite_schema WHERE name = 'host_context'"),
+              "malformed database schema (metadata) - table metadata already exists");
+}
+
 TEST_F(HostileArrayFile, fault_48_withoutAPartOfItsLayoutIsRefused) {
     EXPECT_EQ(damage("DROP TABLE metadata"), "a part of its layout is gone");
 }
@@ -57,6 +70,21 @@ TEST_F(HostileArrayFile, fault_48_withoutABlockSizeIsRefused) {
 TEST_F(HostileArrayFile, fault_48_withNegativeSizesIsRefused) {
     EXPECT_EQ(damage("UPDATE volume SET size_mb = -1, committed_mb = -1, unshared_mb = -1"),
               std::string("the virtual volume ") + webId + " has sizes that cannot be");
+}
+
+TEST_F(HostileArrayFile, fault_48_withSizesThatContradictEachOtherIsRefused) {
+    for (char const *const sizes : {
+             "size_mb = 0, committed_mb = 0, unshared_mb = 0",
+             "size_mb = 10, committed_mb = -1, unshared_mb = NULL",
+             "size_mb = 10, committed_mb = 11, unshared_mb = 0",
+             "size_mb = 10, committed_mb = 5, unshared_mb = -1",
+             "size_mb = 10, committed_mb = 5, unshared_mb = 6",
+             "size_mb = 10, committed_mb = 5, unshared_mb = 5, block_size = -1",
+         }) {
+        EXPECT_EQ(damage(std::string("UPDATE volume SET ") + sizes),
+                  std::string("the virtual volume ") + webId + " has sizes that cannot be")
+            << sizes;
+    }
 }
 
 TEST_F(HostileArrayFile, fault_48_withAVolumeOfNoKindIsRefused) {
@@ -72,6 +100,13 @@ TEST_F(HostileArrayFile, fault_48_withIdsThatAreNoneIsRefused) {
 TEST_F(HostileArrayFile, fault_48_withAContainerOfNoSizeIsRefused) {
     EXPECT_EQ(damage("UPDATE container SET max_lumo_size_mb = 0"),
               std::string("the storage container ") + goldId + " has no size");
+    EXPECT_EQ(failureOf([this] { ArrayFile(path_).configVolumes(goldId, 10); }),
+              "the array file '" + path_ + "' is damaged: the storage container " + goldId + " has no size");
+}
+
+TEST_F(HostileArrayFile, fault_48_withoutTheRowOfTheHostContextIsRefused) {
+    EXPECT_EQ(damage("DELETE FROM host_context"), "it has no place for the host's context");
+    EXPECT_EQ(codeOf([this] { ArrayFile(path_).setHostContext("context"); }), Wire::ErrorCode::FileMalformed);
 }
 
 TEST_F(HostileArrayFile, fault_48_withAnAnswerThatNobodyGaveIsRefused) {
@@ -80,5 +115,10 @@ TEST_F(HostileArrayFile, fault_48_withAnAnswerThatNobodyGaveIsRefused) {
     spec.containerId = goldId;
     spec.directoryName = "new";
     file.createVolume("key", spec);
-    EXPECT_EQ(damage("UPDATE answer SET size_mb = -1"), "the answer to an earlier request has sizes that cannot be");
+    for (char const *const sizes : {"size_mb = -1", "size_mb = 1, block_size = 0"}) {
+        EXPECT_EQ(damage(std::string("UPDATE answer SET ") + sizes),
+                  "the answer to an earlier request has sizes that cannot be");
+    }
+    EXPECT_EQ(damage("UPDATE answer SET uuid = NULL"), "the answer to an earlier request names no virtual volume");
+    EXPECT_EQ(ArrayFile(path_).counts().configVolumes, 3);
 }
