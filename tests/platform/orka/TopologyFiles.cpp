@@ -134,6 +134,15 @@ TEST_F(MakingAnArrayFile, takesAwayAbandonedDraftsAndNothingElse) {
     EXPECT_EQ(filesInDirectory(), expected);
 }
 
+TEST_F(MakingAnArrayFile, takesANameWithoutADirectoryAsOneOfTheWorkingDirectory) {
+    auto const before = std::filesystem::current_path();
+    std::filesystem::current_path(directory_);
+    makeArrayFile(other(), "x.array", Replace::Never);
+    std::filesystem::current_path(before);
+    EXPECT_EQ(filesInDirectory(), std::vector<std::string>{"x.array"});
+    EXPECT_EQ(ArrayFile(at("x.array")).inventory().arrays, other().arrays);
+}
+
 TEST_F(MakingAnArrayFile, needsNoRightToReadItsDirectory) {
     std::filesystem::create_directory(at("open"));
     std::filesystem::create_directory(at("closed"));

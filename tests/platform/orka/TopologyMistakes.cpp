@@ -59,6 +59,8 @@ std::vector<Mistake> const mistakes{
      "t.json: arrays: a list is expected, not the text \"\xF0\x9F\x98\x80\""},
     {"NoSurrogateBehindABackslash", R"({"arrays": "\\ude00"})",
      "t.json: arrays: a list is expected, not the text \"\\\\ude00\""},
+    {"NoSurrogateAboveThePairs", R"({"arrays": "\ue000\uffff"})",
+     "t.json: arrays: a list is expected, not the text \"\xEE\x80\x80\xEF\xBF\xBF\""},
     {"DeeplyNested", std::string(1000000, '['), "t.json: line 1, column 1000001: Invalid value."},
 
     // The document.

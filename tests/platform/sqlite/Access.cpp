@@ -104,6 +104,7 @@ TEST_F(AccessTest, ValuesComeBackAsTheyWereBound) {
     EXPECT_FALSE(row.isNull(2));
     EXPECT_EQ(row.text(2), "");
     EXPECT_TRUE(row.isNull(3));
+    EXPECT_EQ(row.text(3), "");
     EXPECT_FALSE(row.step());
 }
 
@@ -137,6 +138,18 @@ TEST_F(AccessTest, ARelativeNameIsAFileOfTheWorkingDirectory) {
     EXPECT_TRUE(exists(at(":memory:")));
 }
 
+TEST_F(AccessTest, AWorkingDirectoryThatIsGoneIsNotCalledReadOnly) {
+    std::filesystem::path const before = std::filesystem::current_path();
+    std::filesystem::create_directory(at("gone"));
+    std::filesystem::current_path(at("gone"));
+    std::filesystem::remove(at("gone"));
+    auto const error = errorOf([] { Database(std::string("a.db"), kind(), Mode::Create); });
+    std::filesystem::current_path(before);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::Missing);
+    EXPECT_EQ(error->sentence(), "the test file 'a.db' cannot be opened: No such file or directory");
+}
+
 TEST_F(AccessTest, ADirectoryThatIsMissingIsNotCalledReadOnly) {
     auto const error = errorOf([&] { Database(at("none/a.db"), kind(), Mode::Create); });
     ASSERT_TRUE(error);
@@ -155,10 +168,12 @@ TEST_F(AccessTest, ACachedStatementForgetsItsBindings) {
 
 TEST_F(AccessTest, ReadingOutsideARowIsAnErrorOfOurs) {
     Database database(makeFile("a.db"), kind(), Mode::ReadWrite);
+    std::string const sentence = "the test file '" + at("a.db") + "' cannot be used: a query has no row with a column ";
     Query row(database, "SELECT id FROM item");
-    EXPECT_TRUE(errorOf([&] { row.integer(0); }));
+    EXPECT_EQ(errorOf([&] { row.integer(0); })->sentence(), sentence + "0");
     ASSERT_TRUE(row.step());
-    EXPECT_TRUE(errorOf([&] { row.text(1); }));
+    EXPECT_EQ(errorOf([&] { row.text(1); })->sentence(), sentence + "1");
+    EXPECT_EQ(errorOf([&] { row.isNull(-1); })->sentence(), sentence + "-1");
     EXPECT_TRUE(errorOf([&] { database.query("SELECT nothing FROM nowhere"); }));
 }
 

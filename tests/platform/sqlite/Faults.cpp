@@ -4,8 +4,11 @@
 #include "Fixture.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <chrono>
 #include <filesystem>
+#include <optional>
+#include <system_error>
 
 #include <sqlite3.h>
 #include <sys/resource.h>
@@ -41,6 +44,25 @@ public:
 
 private:
     rlimit before_{};
+};
+
+/// Root may write everything; while it lasts, root is somebody else.
+class Unprivileged {
+public:
+    Unprivileged()
+        : before_(::geteuid()) {
+        if (before_ == 0 && ::seteuid(65534) != 0) {
+            throw std::system_error(errno, std::generic_category(), "seteuid");
+        }
+    }
+    ~Unprivileged() {
+        EXPECT_EQ(::seteuid(before_), 0);
+    }
+    Unprivileged(Unprivileged const &) = delete;
+    Unprivileged &operator=(Unprivileged const &) = delete;
+
+private:
+    uid_t before_;
 };
 
 class FaultTest : public SqliteTest {
@@ -207,9 +229,7 @@ TEST_F(FaultTest, fault_50_AReadOnlyFileStillReads) {
     makeFile("a.db", 2);
     ASSERT_EQ(::chmod(at("a.db").c_str(), 0444), 0);
     ASSERT_EQ(::chmod(directory_.c_str(), 0555), 0);
-    // Root may write everything; become somebody else for a while.
-    bool const root = ::geteuid() == 0;
-    ASSERT_TRUE(!root || ::seteuid(65534) == 0);
+    std::optional<Unprivileged> unprivileged(std::in_place);
     for (Mode const mode : {Mode::Create, Mode::ReadWrite, Mode::QueryOnly}) {
         std::optional<Sqlite::Error> error;
         EXPECT_NO_THROW({
@@ -221,10 +241,29 @@ TEST_F(FaultTest, fault_50_AReadOnlyFileStillReads) {
         EXPECT_EQ(error->kind(), ErrorKind::ReadOnly) << error->sentence();
     }
     auto const made = errorOf([&] { Database(at("b.db"), kind(), Mode::Create); });
-    ASSERT_TRUE(!root || ::seteuid(0) == 0);
+    unprivileged.reset();
     ::chmod(directory_.c_str(), 0755);
     ASSERT_TRUE(made);
     EXPECT_EQ(made->kind(), ErrorKind::ReadOnly) << made->sentence();
+}
+
+TEST_F(FaultTest, fault_50_AFileInADirectoryWithoutRoomForAJournalStillReads) {
+    makeFile("a.db", 2);
+    ASSERT_EQ(::chmod(at("a.db").c_str(), 0666), 0);
+    ASSERT_EQ(::chmod(directory_.c_str(), 0555), 0);
+    std::optional<Unprivileged> unprivileged(std::in_place);
+    std::optional<Sqlite::Error> error;
+    EXPECT_NO_THROW({
+        Database database(at("a.db"), kind(), Mode::ReadWrite);
+        error = errorOf([&] { database.query("DELETE FROM item").run(); });
+        EXPECT_EQ(countItems(database), 2);
+    });
+    unprivileged.reset();
+    ::chmod(directory_.c_str(), 0755);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::ReadOnly);
+    EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") +
+                                     "' cannot be written: it, its directory or its file system is read-only");
 }
 
 TEST_F(FaultTest, fault_52_AReaderRollsAKilledWriterBack) {

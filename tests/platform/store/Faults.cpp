@@ -83,12 +83,14 @@ TEST_F(FaultsTest, fault_48_RefusesAVolumeInNoState) {
     HostStore store(root_, HostStore::Mode::ReadWrite);
     store.addFileSystem({"gold", "c", {}});
     store.putVolumes({{"v", "c", "d", Store::VolumeState::Mounted}}, {});
-    plainSql("PRAGMA ignore_check_constraints=1; UPDATE volume SET state = 7");
-    for (auto const &failure : {failureOf([&] { store.volumes(); }), failureOf([&] { store.volume("v"); })}) {
-        ASSERT_TRUE(failure);
-        EXPECT_EQ(failure->code(), Wire::ErrorCode::FileMalformed);
-        EXPECT_EQ(failure->sentence(),
-                  "the host store '" + file() + "' is damaged: it knows no state 7 of config volumes");
+    for (std::string const state : {"7", "-1"}) {
+        plainSql("PRAGMA ignore_check_constraints=1; UPDATE volume SET state = " + state);
+        for (auto const &failure : {failureOf([&] { store.volumes(); }), failureOf([&] { store.volume("v"); })}) {
+            ASSERT_TRUE(failure);
+            EXPECT_EQ(failure->code(), Wire::ErrorCode::FileMalformed);
+            EXPECT_EQ(failure->sentence(),
+                      "the host store '" + file() + "' is damaged: it knows no state " + state + " of config volumes");
+        }
     }
 }
 

@@ -252,6 +252,22 @@ TEST_F(Framing, fault_23_a_peer_that_leaves_in_mid_message_is_a_failure) {
     }
 }
 
+TEST_F(Framing, fault_23_a_peer_that_leaves_without_reading_is_a_failure) {
+    capnp::MallocMessageBuilder message;
+    fillPing(message, "unread");
+    Wire::send(here_.get(), message, Wire::requestBytesMax, in(patience));
+    there_.reset(); // resets the connection, as what was sent is lost
+    EXPECT_EQ(sentenceOf([&] { Wire::receive(here_.get(), buffer_, Wire::replyBytesMax, in(patience)); }),
+              "the peer closed the connection");
+}
+
+TEST_F(Framing, fault_18_holds_the_deadline_on_a_descriptor_that_does_not_block) {
+    ASSERT_EQ(fcntl(here_.get(), F_SETFL, O_NONBLOCK), 0);
+    sendTable({0});
+    EXPECT_EQ(sentenceOf([&] { Wire::receive(here_.get(), buffer_, Wire::replyBytesMax, in(50)); }),
+              "the peer was too slow");
+}
+
 TEST_F(Framing, tells_what_the_system_said_of_something_that_is_no_socket) {
     Wire::UniqueFd const file(open("/dev/null", O_RDWR | O_CLOEXEC));
     std::uint64_t const word = 0;

@@ -110,6 +110,8 @@ TEST_F(ProviderFaultTest, fault_39_whatIsJsonAndNotTheAnswerIsNamedByItsPath) {
     for (auto const &[body, what] : {
              Lie{R"([])", "the document: an object is expected, not a list"},
              Lie{R"({"unchanged": false, "items": []})", "the document: the member \"version\" is missing"},
+             Lie{R"({"version": null, "unchanged": false, "items": []})",
+                 "the document: the member \"version\" is missing"},
              Lie{R"({"version": "1", "unchanged": false, "items": [{"id": "x"}]})",
                  "items[0].id: a UUID is expected, not \"x\""},
              Lie{R"({"version": "1", "unchanged": false, "items": [{"id": "00000000-0000-4000-8000-00000000000a",
@@ -129,6 +131,11 @@ TEST_F(ProviderFaultTest, fault_39_whatIsJsonAndNotTheAnswerIsNamedByItsPath) {
     EXPECT_EQ(sentence(newClient()->unsharedChunksVirtualVolume(context(), goldId, webId)),
               "the provider at array.test:8443 gave an answer that is not what it should be: "
               "unsharedChunksVirtualVolume: bitmap: base64 is expected");
+    serveText(200, R"({"volume": {"uuid": "10000000-0000-4000-8000-000000000001",
+        "containerId": "00000000-0000-4000-8000-00000000000a", "kind": "neither"}})");
+    EXPECT_EQ(sentence(newClient()->queryVirtualVolumeByDirectoryName(context(), goldId, "web")),
+              "the provider at array.test:8443 gave an answer that is not what it should be: "
+              "queryVirtualVolumeByDirectoryName: volume.kind: \"config\" or \"data\" is expected, not \"neither\"");
     serveText(200, R"({"items": {}})");
     EXPECT_EQ(sentence(newClient()->getMetadata(context(), goldId, webId)),
               "the provider at array.test:8443 gave an answer that is not what it should be: "
