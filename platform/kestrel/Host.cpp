@@ -8,6 +8,7 @@ namespace Kestrel {
 Host::Host(LumoClient::Settings const &settings)
     : store(settings.root, Store::HostStore::Mode::ReadWrite)
     , client(settings)
+    , containerCheck(client)
     , places(Wire::Paths(settings.root).root()) {}
 
 std::shared_ptr<Host> Host::ofEnvironment() {

@@ -4,6 +4,7 @@
 #include <chrono>
 #include <memory>
 
+#include "ContainerCheck.h"
 #include "Places.h"
 #include "lumolib/Client.h"
 #include "store/HostStore.h"
@@ -20,6 +21,7 @@ struct Host {
 
     Store::HostStore store;
     LumoClient::Client client;
+    ContainerCheck containerCheck;
     Places places;
     /// How long to wait for another process that is mounting or unmounting.
     std::chrono::milliseconds lockTimeout{5000};

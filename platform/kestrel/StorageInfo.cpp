@@ -147,7 +147,7 @@ Gantry::Storage::LumoFileSystem *StorageInfoImpl::AddLumoFileSystem(std::string 
         HostPointer const &host = hostOf(impl_);
         requireContainerName(name);
         std::string const containerId = requireContainerId(id);
-        host->client.findStorageContainer(containerId, arrayIds);
+        host->containerCheck.require(containerId, arrayIds);
         addToHost(*host, {name, containerId, arrayIds}, mount);
         LumoPlatform_NoteOneDone();
         id = containerId;

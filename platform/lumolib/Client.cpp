@@ -29,39 +29,53 @@ void fillKey(Compact::VolumeKey::Builder builder, VolumeKey const &key) {
     builder.setDirectoryName(key.directoryName);
 }
 
-Container containerOf(Connection const &connection, Compact::StorageContainer::Reader answered,
-                      std::vector<std::string> const &table) {
-    Container container;
-    container.id = answered.getId();
-    container.name = answered.getName();
-    container.providerUrl = answered.getProviderUrl();
-    container.maxLumoSizeMb = answered.getMaxLumoSizeMb();
-    for (std::uint32_t const place : answered.getArrays()) {
-        if (place >= table.size()) {
-            throw connection.unexpected("a container names array " + std::to_string(place) + " of " +
-                                        std::to_string(table.size()));
+/// The ids of the arrays that the replies of one answer have told so far; containers name them by their places.
+class ArrayTable {
+public:
+    explicit ArrayTable(Connection const &connection)
+        : connection_(connection) {}
+
+    void take(Compact::List<Compact::StorageArray>::Reader arrays) {
+        connection_.requireChunk(arrays.size());
+        for (Compact::StorageArray::Reader const array : arrays) {
+            ids_.emplace_back(array.getId());
         }
-        container.arrayIds.push_back(table[place]);
     }
-    return container;
-}
+
+    /// Replaces what is in `ids`, whose memory is used again.
+    void idsOf(Compact::StorageContainer::Reader container, std::vector<std::string> &ids) const {
+        ids.clear();
+        for (std::uint32_t const place : container.getArrays()) {
+            if (place >= ids_.size()) {
+                throw connection_.unexpected("a container names array " + std::to_string(place) + " of " +
+                                             std::to_string(ids_.size()));
+            }
+            ids.push_back(ids_[place]);
+        }
+    }
+
+private:
+    Connection const &connection_;
+    std::vector<std::string> ids_;
+};
 
 /// One reply on the way to a single container: arrays for the table, then the container.
-void takeContainer(Connection const &connection, Compact::Reply::Reader reply, std::vector<std::string> &table,
+void takeContainer(Connection const &connection, Compact::Reply::Reader reply, ArrayTable &table,
                    std::optional<Container> &found) {
     if (reply.isStorageArrays()) {
-        Compact::List<Compact::StorageArray>::Reader const arrays = reply.getStorageArrays();
-        connection.requireChunk(arrays.size());
-        for (Compact::StorageArray::Reader const array : arrays) {
-            table.emplace_back(array.getId());
-        }
+        table.take(reply.getStorageArrays());
     } else if (reply.isStorageContainers()) {
         Compact::List<Compact::StorageContainer>::Reader const containers = reply.getStorageContainers();
         if (containers.size() + (found ? 1 : 0) > 1) {
             throw connection.unexpected("it answered several containers of one id");
         }
-        if (containers.size() == 1) {
-            found = containerOf(connection, containers[0], table);
+        for (Compact::StorageContainer::Reader const answered : containers) {
+            found = Container{std::string(answered.getId()),
+                              std::string(answered.getName()),
+                              std::string(answered.getProviderUrl()),
+                              answered.getMaxLumoSizeMb(),
+                              {}};
+            table.idsOf(answered, found->arrayIds);
         }
     } else if (!reply.isDone()) {
         throw connection.unexpected("it answered something else than a storage container");
@@ -127,7 +141,7 @@ DaemonStatus Client::ping() {
 }
 
 Container Client::findStorageContainer(std::string const &containerId, std::vector<std::string> const &arrayIds) {
-    std::vector<std::string> table;
+    ArrayTable table(*ordered_);
     std::optional<Container> found;
     ordered_->request(
         Repeat::Always, ordered_->deadline(),
@@ -142,6 +156,28 @@ Container Client::findStorageContainer(std::string const &containerId, std::vect
                             "no provider exports the storage container " + containerId);
     }
     return *found;
+}
+
+void Client::visitStorageContainers(VisitContainer const &visit) {
+    ArrayTable table(*ordered_);
+    std::vector<std::string> arrayIds;
+    ordered_->request(
+        Repeat::Always, ordered_->deadline(),
+        [](Compact::Request::Builder request) { request.setGetStorageContainer(); },
+        [&](Compact::Reply::Reader reply) {
+            if (reply.isStorageArrays()) {
+                table.take(reply.getStorageArrays());
+            } else if (reply.isStorageContainers()) {
+                Compact::List<Compact::StorageContainer>::Reader const containers = reply.getStorageContainers();
+                ordered_->requireChunk(containers.size());
+                for (Compact::StorageContainer::Reader const container : containers) {
+                    table.idsOf(container, arrayIds);
+                    visit(container.getId(), arrayIds);
+                }
+            } else if (!reply.isDone()) {
+                throw ordered_->unexpected("it answered something else than storage containers");
+            }
+        });
 }
 
 Volume Client::createVirtualVolume(NewVolume const &volume, Channel channel) {

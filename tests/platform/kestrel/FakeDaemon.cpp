@@ -127,6 +127,16 @@ void FakeDaemon::answer(Wire::Request::Reader request, Wire::Reply::Builder repl
             container.setName(containers_[id]);
             break;
         }
+        case Wire::Request::GET_STORAGE_CONTAINER: {
+            note("list");
+            auto containers = reply.initStorageContainers(static_cast<unsigned>(containers_.size()));
+            unsigned next = 0;
+            for (auto const &[id, name] : containers_) {
+                containers[next].setId(id);
+                containers[next++].setName(name);
+            }
+            break;
+        }
         case Wire::Request::CREATE_VIRTUAL_VOLUME:
             note("create " + stringOf(request.getCreateVirtualVolume().getDirectoryName()));
             create(request.getCreateVirtualVolume(), reply);
@@ -218,6 +228,11 @@ std::string FakeDaemon::find(Wire::VolumeKey::Reader key) {
 void FakeDaemon::addContainer(std::string const &id, std::string const &name) {
     std::lock_guard const lock(mutex_);
     containers_[id] = name;
+}
+
+void FakeDaemon::removeContainer(std::string const &id) {
+    std::lock_guard const lock(mutex_);
+    containers_.erase(id);
 }
 
 void FakeDaemon::addVolume(std::string const &uuid, std::string const &containerId, std::string const &directoryName) {

@@ -34,6 +34,7 @@ public:
     FakeDaemon &operator=(FakeDaemon const &) = delete;
 
     void addContainer(std::string const &id, std::string const &name);
+    void removeContainer(std::string const &id);
     void addVolume(std::string const &uuid, std::string const &containerId, std::string const &directoryName);
     void addEndpoint(std::string const &uid, std::vector<std::string> const &containerNames);
     void removeVolume(std::string const &uuid);

@@ -189,6 +189,67 @@ TEST_F(Client, fault_24_finds_no_container_in_an_answer_without_one_or_with_two)
               "5: the daemon at " + socket() + " broke the protocol: it answered several containers of one id");
 }
 
+using Told = std::vector<std::pair<std::string, std::vector<std::string>>>;
+
+Told visited(LumoClient::Client &client) {
+    Told told;
+    client.visitStorageContainers(
+        [&told](std::string_view id, std::vector<std::string> const &arrayIds) { told.emplace_back(id, arrayIds); });
+    return told;
+}
+
+TEST_F(Client, visits_the_containers_of_all_chunks_in_order) {
+    auto const daemon = serve([](Wire::Request::Reader request, Peer &peer) {
+        peer.reply(
+            request.getId(),
+            [](Wire::Reply::Builder reply) {
+                auto arrays = reply.initStorageArrays(2);
+                arrays[0].setId("a0");
+                arrays[1].setId("a1");
+            },
+            false);
+        peer.reply(
+            request.getId(),
+            [](Wire::Reply::Builder reply) {
+                auto containers = reply.initStorageContainers(2);
+                containers[0].setId("c0");
+                containers[0].initArrays(2).set(0, 1);
+                containers[1].setId("c1");
+            },
+            false);
+        peer.reply(request.getId(), [](Wire::Reply::Builder reply) {
+            auto containers = reply.initStorageContainers(1);
+            containers[0].setId("c2");
+            containers[0].initArrays(1).set(0, 1);
+        });
+    });
+    LumoClient::Client client(Settings::fromEnvironment());
+    EXPECT_EQ(visited(client), (Told{{"c0", {"a1", "a0"}}, {"c1", {}}, {"c2", {"a1"}}}));
+    EXPECT_EQ(daemon->asked().at(0), R"((traceId = "", getStorageContainer = void))");
+}
+
+TEST_F(Client, visits_nothing_where_no_provider_exports_anything) {
+    auto const daemon = serve(answerDone);
+    LumoClient::Client client(Settings::fromEnvironment());
+    EXPECT_EQ(visited(client), Told());
+}
+
+TEST_F(Client, fault_24_refuses_containers_that_make_no_sense) {
+    std::function<void(Wire::Reply::Builder)> fill;
+    auto const daemon =
+        serve([&fill](Wire::Request::Reader request, Peer &peer) { peer.reply(request.getId(), fill); });
+    LumoClient::Client client(Settings::fromEnvironment());
+    auto const broke = [this](std::string const &what) {
+        return "5: the daemon at " + socket() + " broke the protocol: " + what;
+    };
+    fill = [](Wire::Reply::Builder reply) { reply.initStorageContainers(1)[0].initArrays(1).set(0, 3); };
+    EXPECT_EQ(failureOf([&] { visited(client); }), broke("a container names array 3 of 0"));
+    fill = [](Wire::Reply::Builder reply) { reply.initPong(); };
+    EXPECT_EQ(failureOf([&] { visited(client); }), broke("it answered something else than storage containers"));
+    fill = [](Wire::Reply::Builder reply) { reply.initStorageContainers(1001); };
+    EXPECT_NE(failureOf([&] { visited(client); }).find("broke the protocol"), std::string::npos);
+}
+
 TEST_F(Client, tells_the_containers_of_an_endpoint) {
     auto const daemon = serve([](Wire::Request::Reader request, Peer &peer) {
         peer.reply(request.getId(), [](Wire::Reply::Builder reply) {

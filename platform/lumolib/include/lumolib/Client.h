@@ -14,8 +14,10 @@
 
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "wire/Failure.h"
@@ -94,6 +96,11 @@ public:
     /// @param arrayIds    every one must hold the container; empty asks for no particular one
     /// @throw Wire::Failure NoSuchContainer, NoSuchArray and what keeps the daemon from asking
     Container findStorageContainer(std::string const &containerId, std::vector<std::string> const &arrayIds);
+
+    /// Every container that a provider exports, in the order in which the daemon tells them. The views live during the
+    /// call.
+    using VisitContainer = std::function<void(std::string_view id, std::vector<std::string> const &arrayIds)>;
+    void visitStorageContainers(VisitContainer const &visit);
 
     /// These four return the volume as it is, or was, when they are done.
     Volume createVirtualVolume(NewVolume const &volume, Channel channel);
