@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "StorageContainerLoad.h"
 
-#include <unordered_set>
+#include <string_view>
+#include <unordered_map>
+#include <utility>
 
 #include <boost/make_shared.hpp>
 
@@ -82,8 +84,42 @@ ListPtr StorageContainerLoad::GetStorageArrayList(std::vector<SAInfo> &arrays) {
 
 namespace {
 
-/// A hash set, since a host may have a hundred thousand containers.
-using Names = std::unordered_set<std::string>;
+/// The names of what is mounted, of which a host may have a hundred thousand. The daemon mostly tells containers in the
+/// order in which they were mounted, so that each is the one behind the last; only when one is not are the names
+/// hashed.
+class Names {
+public:
+    explicit Names(std::vector<LumoFileSystem *> const &mounted) {
+        names_.reserve(mounted.size());
+        for (LumoFileSystem *const fileSystem : mounted) {
+            names_.push_back(fileSystem->GetName());
+        }
+    }
+
+    bool has(std::string_view name) {
+        if (next_ < names_.size() && names_[next_] == name) {
+            ++next_;
+            return true;
+        }
+        if (places_.empty()) {
+            places_.reserve(names_.size());
+            for (size_t place = 0; place < names_.size(); ++place) {
+                places_.emplace(names_[place], place);
+            }
+        }
+        auto const found = places_.find(name);
+        if (found == places_.end()) {
+            return false;
+        }
+        next_ = found->second + 1;
+        return true;
+    }
+
+private:
+    std::vector<std::string> names_;
+    size_t next_ = 0;
+    std::unordered_map<std::string_view, size_t> places_;
+};
 
 /// Mounts a container. The caller deletes the file system of the last mount only: those of earlier mounts stay with the
 /// process, which ends with the command.
@@ -140,14 +176,11 @@ void StorageContainerLoad::ExecuteInternal(InputPtr const & /*input*/, OutputPtr
     LumoFileSystem *lastAdded = nullptr;
     try {
         mounted = host.GetLumoFileSystems();
-        Names mountedNames;
-        for (LumoFileSystem *const fileSystem : mounted) {
-            mountedNames.insert(fileSystem->GetName());
-        }
+        Names mountedNames(mounted);
         ListPtr const list = makeStructList(GetOutputStructure());
         for (uint32_t i = 0; i < containers->containerCount; ++i) {
             StorageContainerInfo const &container = *containers->containers[i];
-            if (mountedNames.count(textOrEmpty(container.name)) != 0) {
+            if (mountedNames.has(container.name == nullptr ? "" : container.name)) {
                 continue;
             }
             lastAdded = mountContainer(host, container);
