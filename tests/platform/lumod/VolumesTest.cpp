@@ -222,4 +222,25 @@ TEST_F(VolumesTest, AnInjectedFaultTakesTheOperationsPlace) {
     EXPECT_EQ(create("b").code(), ErrorCode::Success);
 }
 
+TEST_F(VolumesTest, AFaultRuleIsChangedByEitherOfItsNumbersAndRemovedByNone) {
+    auto const rule = [](Wire::FaultInjectionRule::Builder builder, int32_t frequency, int32_t timeMs) {
+        builder.setFault("RESOURCE_BUSY");
+        builder.setOperation("bindVirtualVolume");
+        builder.setFrequency(frequency);
+        builder.setTimeMs(timeMs);
+    };
+    ask([&](Wire::Request::Builder request) { rule(request.initAddFaultInjectionRule(), 2, -1); });
+    std::string const subject = "the fault rule RESOURCE_BUSY for bindVirtualVolume";
+    EXPECT_TRUE(sink_.holds("added " + subject + ": frequency 2, time -1 ms"));
+    for (auto const &[frequency, timeMs] : {std::pair{3, -1}, std::pair{-1, 500}, std::pair{3, 500}}) {
+        ask([&, each = frequency, limit = timeMs](Wire::Request::Builder request) {
+            rule(request.initModifyFaultInjectionRule(), each, limit);
+        });
+        EXPECT_TRUE(sink_.holds("changed " + subject + ": frequency " + std::to_string(frequency) + ", time " +
+                                std::to_string(timeMs) + " ms"));
+    }
+    ask([&](Wire::Request::Builder request) { rule(request.initModifyFaultInjectionRule(), -1, -1); });
+    EXPECT_TRUE(sink_.holds("removed " + subject));
+}
+
 } // namespace

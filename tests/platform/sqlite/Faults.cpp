@@ -124,6 +124,23 @@ TEST_F(FaultTest, fault_62_WithoutADescriptorAFileCannotBeOpenedOrWritten) {
     EXPECT_EQ(countItems(database), 2);
 }
 
+TEST_F(FaultTest, fault_50_AJournalThatCannotBeMadeInAReadOnlyDirectoryIsNotCalledAnIoError) {
+    Database database(makeFile("a.db"), kind(), Mode::ReadWrite);
+    ASSERT_EQ(::chmod(directory_.c_str(), 0555), 0);
+    // SQLite tells a directory that may not be written only by EACCES, and there are more ways to be refused.
+    std::optional<Unprivileged> unprivileged(std::in_place);
+    NoDescriptors none;
+    auto const error = errorOf([&] { database.query("DELETE FROM item").run(); });
+    none.end();
+    unprivileged.reset();
+    ::chmod(directory_.c_str(), 0755);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->kind(), ErrorKind::ReadOnly);
+    EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") +
+                                     "' cannot be written: it, its directory or its file system is read-only");
+    EXPECT_EQ(countItems(database), 1);
+}
+
 TEST_F(FaultTest, fault_48_AnIntegrityCheckFindsWhatNobodyReadYet) {
     makeFile("a.db", 50);
     Database(at("a.db"), kind(), Mode::QueryOnly).checkIntegrity();
