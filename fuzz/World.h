@@ -19,6 +19,11 @@ public:
     World()
         : scope_(loop_)
         , timer_(kj::origin<kj::TimePoint>()) {}
+    /// A world in which there are sockets.
+    explicit World(kj::EventPort &port)
+        : loop_(port)
+        , scope_(loop_)
+        , timer_(kj::origin<kj::TimePoint>()) {}
 
     kj::Timer &timer() {
         return timer_;

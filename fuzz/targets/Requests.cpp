@@ -2,12 +2,16 @@
 //
 // A client of the daemon sends any bytes over its socket: messages, and what they ask. The input's first bit chooses
 // the socket (ordered or priority). Each input meets the same daemon, fresh: a provider with two containers in memory.
+#include <cerrno>
 #include <chrono>
 #include <memory>
 #include <string>
+#include <utility>
 
 #include <capnp/serialize.h>
 #include <fmt/format.h>
+#include <kj/async-unix.h>
+#include <sys/socket.h>
 
 #include "Connection.h"
 #include "FakeVendor.h"
@@ -80,8 +84,62 @@ void checkReplies(std::string_view heard) {
     }
 }
 
+std::pair<kj::AutoCloseFd, kj::AutoCloseFd> socketPair() {
+    int ends[2];
+    require(::socketpair(AF_UNIX, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0, ends) == 0, "there are sockets");
+    return {kj::AutoCloseFd(ends[0]), kj::AutoCloseFd(ends[1])};
+}
+
+/// Says what it has to say, whatever it hears, and then no more.
+class Client {
+public:
+    Client(kj::UnixEventPort &port, kj::AutoCloseFd end, std::string_view says)
+        : end_(kj::mv(end))
+        , observer_(port, end_.get(), kj::UnixEventPort::FdObserver::OBSERVE_READ_WRITE)
+        , says_(says)
+        , saying_(say().eagerlyEvaluate([](kj::Exception &&) {})) {} // nobody listened to the end
+
+    /// What it heard, once the other end has closed the connection.
+    kj::Promise<std::string> heard() {
+        char buffer[4096];
+        for (;;) {
+            ssize_t const got = ::recv(end_.get(), buffer, sizeof buffer, 0);
+            if (got < 0 && errno == EAGAIN) {
+                return observer_.whenBecomesReadable().then([this] { return heard(); });
+            }
+            if (got <= 0) {
+                return std::move(heard_);
+            }
+            heard_.append(buffer, static_cast<std::size_t>(got));
+        }
+    }
+
+private:
+    kj::Promise<void> say() {
+        while (!says_.empty()) {
+            ssize_t const sent = ::send(end_.get(), says_.data(), says_.size(), MSG_NOSIGNAL);
+            if (sent < 0 && errno == EAGAIN) {
+                return observer_.whenBecomesWritable().then([this] { return say(); });
+            }
+            if (sent < 0) {
+                return kj::READY_NOW;
+            }
+            says_.remove_prefix(static_cast<std::size_t>(sent));
+        }
+        ::shutdown(end_.get(), SHUT_WR);
+        return kj::READY_NOW;
+    }
+
+    kj::AutoCloseFd end_;
+    kj::UnixEventPort::FdObserver observer_;
+    std::string_view says_;
+    std::string heard_;
+    kj::Promise<void> saying_;
+};
+
 void serve(std::string const &root, bool isOrdered, std::string_view says) {
-    Fuzz::World world;
+    static kj::UnixEventPort port;
+    Fuzz::World world(port);
     auto const vendor = someVendor();
     NoLog sink;
     Lumod::Log log(sink, Lumod::LogLevel::Trivia, [] { return std::chrono::system_clock::time_point(); });
@@ -94,16 +152,18 @@ void serve(std::string const &root, bool isOrdered, std::string_view says) {
                                                        },
                                                        [&] { return fmt::format("key-{}", ++keys); }});
     Lumod::Shutdown shutdown;
-    auto pipe = kj::newTwoWayPipe();
-    Fuzz::Peer peer(kj::mv(pipe.ends[0]), says);
-    auto connection = kj::heap<Lumod::Connection>(daemon.core(), shutdown, kj::mv(pipe.ends[1]), isOrdered, 1);
+    Lumod::ReplyRoom room;
+    auto ends = socketPair();
+    Client client(port, kj::mv(ends.first), says);
+    auto connection =
+        kj::heap<Lumod::Connection>(daemon.core(), shutdown, room, port, kj::mv(ends.second), isOrdered, 1);
     auto running = connection->run().catch_([](kj::Exception &&exception) {
         // A peer that leaves in the middle of an answer; everything else is a defect.
         require(exception.getType() == kj::Exception::Type::DISCONNECTED, "a connection ends in order",
                 exception.getDescription().cStr());
     });
     auto serving = running.attach(kj::mv(connection)).eagerlyEvaluate(nullptr);
-    checkReplies(world.finish(peer.heard()));
+    checkReplies(world.finish(client.heard()));
     world.finish(kj::mv(serving));
 }
 

@@ -4,7 +4,6 @@
 #include <algorithm>
 #include <utility>
 
-#include <capnp/serialize-async.h>
 #include <fmt/format.h>
 
 #include "Broken.h"
@@ -20,17 +19,14 @@ using Wire::Failure;
 namespace {
 
 constexpr kj::Duration longestDeadline = 1 * kj::HOURS;
+/// How long a peer may take to send a request that it has begun.
+constexpr kj::Duration readPatience = 10 * kj::SECONDS;
 /// How long a peer may take for one message of an answer.
 constexpr kj::Duration writePatience = 30 * kj::SECONDS;
-/// A buffer that grew for a long request is given back after it.
-constexpr std::size_t keptBufferBytes = std::size_t{64} << 10;
-/// What a message takes besides its list, and what an estimate may be short by.
-constexpr std::size_t messageWords = 1024;
+/// A message whose list is longer is built in room of its own.
+constexpr std::size_t smallReplyBytes = std::size_t{4} << 10;
 
-/// A first segment with room for about so many bytes: a message of one segment is the quickest to read.
-unsigned segmentWords(std::size_t bytes) {
-    return static_cast<unsigned>(messageWords + bytes / sizeof(capnp::word) * 9 / 8);
-}
+constexpr char const *requestFailed = "the request failed";
 
 /// The client stops waiting at its deadline, so ours are before it: providers first, who can say what they were doing,
 /// then whatever else hangs.
@@ -50,51 +46,123 @@ struct Deadlines {
     }
 };
 
+kj::Promise<void> promiseOf(kj::Maybe<kj::Promise<void>> rest) {
+    KJ_IF_MAYBE (promise, rest) {
+        return kj::mv(*promise);
+    }
+    return kj::READY_NOW;
+}
+
+struct LongReply {
+    LongReply(std::size_t bytes, uint64_t id)
+        : room(bytes)
+        , message(room, id) {}
+
+    ReplyRoom room;
+    ReplyMessage message; ///< leaves the room clean, so it ends first
+};
+
+/// Builds the next message of an answer. @return whether more follow @throws Failure MessageTooLarge
+bool fill(ReplyMessage &message, ReplySource &source) {
+    bool const more = source.next(message.reply());
+    message.reply().setLast(!more);
+    if (message.framed().size() > Wire::replyBytesMax) {
+        throw Failure(ErrorCode::MessageTooLarge, "the answer holds an element that is too large for one message");
+    }
+    return more;
+}
+
 } // namespace
 
-Connection::Connection(Core &core, Shutdown &shutdown, kj::Own<kj::AsyncIoStream> stream, bool ordered, uint64_t number)
+Connection::Connection(Core &core, Shutdown &shutdown, ReplyRoom &room, kj::UnixEventPort &port, kj::AutoCloseFd socket,
+                       bool ordered, uint64_t number)
     : core_(core)
     , shutdown_(shutdown)
-    , stream_(kj::mv(stream))
+    , room_(room)
+    , socket_(port, kj::mv(socket))
     , ordered_(ordered)
     , number_(number)
-    , reader_(*stream_, core.timer) {}
+    , reader_(socket_) {}
 
 kj::Promise<void> Connection::run() {
-    auto drained = shutdown_.draining().then([] { return Outcome<bool>(false); });
-    return reader_.next().exclusiveJoin(kj::mv(drained)).then([this](Outcome<bool> &&got) -> kj::Promise<void> {
-        if (!got.ok()) {
-            core_.log.write(LogLevel::Warning, "-",
-                            fmt::format("closed connection {}: {}", number_, got.failure().sentence()));
-            return kj::READY_NOW;
-        }
-        if (!got.value()) {
-            return kj::READY_NOW;
-        }
-        return answer().then([this]() -> kj::Promise<void> {
-            message_ = nullptr;
-            if (reader_.buffer().capacityBytes() > keptBufferBytes) {
-                reader_.buffer().release();
+    auto drained = shutdown_.draining().then(
+        [this] { return isAnswering_ ? kj::Promise<void>(kj::NEVER_DONE) : kj::Promise<void>(kj::READY_NOW); });
+    return serve().exclusiveJoin(kj::mv(drained));
+}
+
+kj::Promise<void> Connection::serve() {
+    try {
+        MessageReader::Progress progress = reader_.advance();
+        if (progress == MessageReader::Progress::Whole) {
+            KJ_IF_MAYBE (rest, answer()) {
+                isAnswering_ = true;
+                return rest->then([this] {
+                    isAnswering_ = false;
+                    dropRequest();
+                    return shutdown_.isDraining() ? kj::Promise<void>(kj::READY_NOW) : serveLater();
+                });
             }
-            // Later: a client that sends without a pause lets the others have their turn.
-            return shutdown_.isDraining() ? kj::Promise<void>(kj::READY_NOW) : kj::evalLater([this] { return run(); });
-        });
+            dropRequest();
+            progress = reader_.advance();
+        }
+        switch (progress) {
+        case MessageReader::Progress::Whole:
+            return serveLater();
+        case MessageReader::Progress::Waiting:
+            return waitForMore();
+        case MessageReader::Progress::Closed:
+            break;
+        }
+    } catch (Failure const &failure) {
+        logClosed(failure);
+    }
+    return kj::READY_NOW;
+}
+
+kj::Promise<void> Connection::serveLater() {
+    return kj::evalLater([this] { return serve(); });
+}
+
+kj::Promise<void> Connection::waitForMore() {
+    if (!reader_.hasBegun()) {
+        return socket_.readable().then([this] { return serve(); });
+    }
+    // One deadline for the whole message: a byte now and then does not move it.
+    if (!requestDue_) {
+        requestDue_ = core_.timer.now() + readPatience;
+    }
+    auto tooSlow = core_.timer.atTime(*requestDue_).then([] { return false; });
+    auto came = socket_.readable().then([] { return true; });
+    return came.exclusiveJoin(kj::mv(tooSlow)).then([this](bool hasCome) {
+        if (hasCome) {
+            return serve();
+        }
+        logClosed(Failure(ErrorCode::DeadlineExceeded, "a request was begun and not finished in time"));
+        return kj::Promise<void>(kj::READY_NOW);
     });
+}
+
+void Connection::logClosed(Failure const &failure) {
+    core_.log.write(LogLevel::Warning, "-", fmt::format("closed connection {}: {}", number_, failure.sentence()));
+}
+
+void Connection::dropRequest() {
+    message_.reset();
+    reader_.drop();
+    requestDue_.reset();
 }
 
 Wire::Request::Reader Connection::parse(uint64_t &id) {
     try {
-        Wire::MessageBuffer &buffer = reader_.buffer();
-        auto message =
-            kj::heap<capnp::SegmentArrayMessageReader>(buffer.segments(), Wire::readerOptions(buffer.bodyBytes()));
-        auto const request = message->getRoot<Wire::Request>();
+        auto const segments = reader_.segments();
+        capnp::ReaderOptions const options = Wire::readerOptions(reader_.bodyBytes());
+        auto const request = message_.emplace(segments, options).getRoot<Wire::Request>();
         id = request.getId();
         // Visits everything, also what this version does not know, so that no handler meets a bad pointer half-way.
         request.totalSize();
         // By a reader of its own, so that the handler's may still visit each word as often as it may.
-        capnp::SegmentArrayMessageReader checked(buffer.segments(), Wire::readerOptions(buffer.bodyBytes()));
+        capnp::SegmentArrayMessageReader checked(segments, options);
         readWhole(checked.getRoot<Wire::Request>());
-        message_ = kj::mv(message);
         return request;
     } catch (kj::Exception const &exception) {
         throw Failure(ErrorCode::InvalidRequest,
@@ -102,7 +170,7 @@ Wire::Request::Reader Connection::parse(uint64_t &id) {
     }
 }
 
-kj::Promise<void> Connection::answer() {
+Connection::Rest Connection::answer() {
     uint64_t id = 0;
     Wire::Request::Reader request;
     try {
@@ -117,37 +185,46 @@ kj::Promise<void> Connection::answer() {
     }
     Deadlines const deadlines(core_.timer.now(), request.getDeadlineMs());
     auto const call = std::make_shared<Call const>(Call{std::move(trace), deadlines.providers, ordered_});
-    return handle(request, call, deadlines.end)
-        .then([this, id, call, request](Outcome<ReplyPtr> &&outcome) -> kj::Promise<void> {
-            if (outcome.ok()) {
-                return sendAll(id, std::move(outcome).value());
-            }
-            logFailure(call, request, outcome.failure());
-            return sendFailure(id, outcome.failure());
-        });
+    std::optional<Dispatched> dispatched;
+    KJ_IF_MAYBE (exception, kj::runCatchingExceptions([&] { dispatched = dispatch(core_, call, request); })) {
+        dispatched = Outcome<ReplyPtr>(brokenBy(*exception, requestFailed));
+    }
+    if (auto *outcome = std::get_if<Outcome<ReplyPtr>>(&*dispatched)) {
+        return reply(id, call, request, std::move(*outcome));
+    }
+    auto answered = bounded(std::get<Answer<ReplyPtr>>(*std::move(dispatched)), request, deadlines.end);
+    return answered.then([this, id, call, request](Outcome<ReplyPtr> &&outcome) {
+        return promiseOf(reply(id, call, request, std::move(outcome)));
+    });
 }
 
-Answer<ReplyPtr> Connection::handle(Wire::Request::Reader request, CallPtr const &call, kj::TimePoint end) {
-    auto handled = kj::evalNow([&] {
-                       return dispatch(core_, call, request);
-                   }).catch_([](kj::Exception &&exception) -> Outcome<ReplyPtr> {
-        return brokenBy(exception, "the request failed");
-    });
+Answer<ReplyPtr> Connection::bounded(Answer<ReplyPtr> answer, Wire::Request::Reader request, kj::TimePoint end) {
+    auto handled = answer.catch_(
+        [](kj::Exception &&exception) -> Outcome<ReplyPtr> { return brokenBy(exception, requestFailed); });
     auto tooLate = core_.timer.atTime(end).then([]() -> Outcome<ReplyPtr> {
         return Failure(ErrorCode::DeadlineExceeded, "the daemon did not finish the request before its deadline");
     });
     auto givenUp = shutdown_.givingUp().then([]() -> Outcome<ReplyPtr> {
         return Failure(ErrorCode::ShuttingDown, "the daemon is shutting down and did not finish the request");
     });
-    auto bounded = handled.exclusiveJoin(kj::mv(tooLate)).exclusiveJoin(kj::mv(givenUp));
+    auto ended = handled.exclusiveJoin(kj::mv(tooLate)).exclusiveJoin(kj::mv(givenUp));
     Method const *const method = methodOf(request);
     if (method == nullptr || !method->mayBeAbandoned) {
-        return bounded;
+        return ended;
     }
-    auto abandoned = stream_->whenWriteDisconnected().then([]() -> Outcome<ReplyPtr> {
+    auto abandoned = socket_.disconnected().then([]() -> Outcome<ReplyPtr> {
         return Failure(ErrorCode::ConnectionLost, "the client went away before it was answered");
     });
-    return bounded.exclusiveJoin(kj::mv(abandoned));
+    return ended.exclusiveJoin(kj::mv(abandoned));
+}
+
+Connection::Rest Connection::reply(uint64_t id, CallPtr const &call, Wire::Request::Reader request,
+                                   Outcome<ReplyPtr> outcome) {
+    if (outcome.ok()) {
+        return sendAll(id, std::move(outcome).value());
+    }
+    logFailure(call, request, outcome.failure());
+    return sendFailure(id, outcome.failure());
 }
 
 void Connection::logFailure(CallPtr const &call, Wire::Request::Reader request, Failure const &failure) {
@@ -157,34 +234,59 @@ void Connection::logFailure(CallPtr const &call, Wire::Request::Reader request, 
                                 static_cast<int32_t>(failure.code()), failure.sentence()));
 }
 
-kj::Promise<void> Connection::sendAll(uint64_t id, ReplyPtr source) {
-    auto message = kj::heap<capnp::MallocMessageBuilder>(segmentWords(source->nextBytes()));
-    auto reply = message->initRoot<Wire::Reply>();
-    reply.setId(id);
-    bool const more = source->next(reply);
-    reply.setLast(!more);
-    if (capnp::computeSerializedSizeInWords(*message) * sizeof(capnp::word) > Wire::replyBytesMax) {
-        return sendFailure(
-            id, Failure(ErrorCode::MessageTooLarge, "the answer holds an element that is too large for one message"));
+Connection::Rest Connection::sendAll(uint64_t id, ReplyPtr source) {
+    try {
+        for (;;) {
+            if (source->nextBytes() > smallReplyBytes) {
+                return sendLong(id, std::move(source));
+            }
+            ReplyMessage message(room_, id);
+            bool const more = fill(message, *source);
+            Rest rest = send(message);
+            if (!more) {
+                return rest;
+            }
+            KJ_IF_MAYBE (taken, rest) {
+                return sendAllAfter(kj::mv(*taken), id, std::move(source));
+            }
+        }
+    } catch (Failure const &failure) {
+        return sendFailure(id, failure);
     }
-    auto sent = write(kj::mv(message));
-    return more ? sent.then([this, id, source = std::move(source)]() mutable { return sendAll(id, std::move(source)); })
-                : kj::mv(sent);
 }
 
-kj::Promise<void> Connection::sendFailure(uint64_t id, Failure const &failure) {
-    auto message = kj::heap<capnp::MallocMessageBuilder>(messageWords);
-    auto reply = message->initRoot<Wire::Reply>();
-    reply.setId(id);
-    auto builder = reply.initFailure();
+kj::Promise<void> Connection::sendLong(uint64_t id, ReplyPtr source) {
+    auto built = kj::heap<LongReply>(source->nextBytes(), id);
+    bool const more = fill(built->message, *source);
+    auto taken = inTime(socket_.sendAll(built->message.framed())).attach(kj::mv(built));
+    return more ? sendAllAfter(kj::mv(taken), id, std::move(source)) : kj::mv(taken);
+}
+
+kj::Promise<void> Connection::sendAllAfter(kj::Promise<void> taken, uint64_t id, ReplyPtr source) {
+    return taken.then(
+        [this, id, source = std::move(source)]() mutable { return promiseOf(sendAll(id, std::move(source))); });
+}
+
+Connection::Rest Connection::sendFailure(uint64_t id, Failure const &failure) {
+    ReplyMessage message(room_, id);
+    auto builder = message.reply().initFailure();
     builder.setCode(static_cast<int32_t>(failure.code()));
     builder.setSentence(onOneLine(failure.sentence()).c_str());
-    return write(kj::mv(message));
+    return send(message);
 }
 
-kj::Promise<void> Connection::write(kj::Own<capnp::MallocMessageBuilder> message) {
-    auto written = capnp::writeMessage(*stream_, *message);
-    return core_.timer.timeoutAfter(writePatience, kj::mv(written)).attach(kj::mv(message));
+Connection::Rest Connection::send(ReplyMessage &message) {
+    kj::ArrayPtr<kj::byte const> const bytes = message.framed();
+    std::size_t const sent = socket_.send(bytes);
+    if (sent == bytes.size()) {
+        return nullptr;
+    }
+    kj::Array<kj::byte> rest = kj::heapArray(bytes.slice(sent, bytes.size()));
+    return inTime(socket_.sendAll(rest)).attach(kj::mv(rest));
+}
+
+kj::Promise<void> Connection::inTime(kj::Promise<void> taken) {
+    return core_.timer.timeoutAfter(writePatience, kj::mv(taken));
 }
 
 } // namespace Lumod

@@ -2,6 +2,7 @@
 #include "Dispatch.h"
 
 #include <algorithm>
+#include <array>
 
 #include <fmt/format.h>
 
@@ -42,6 +43,24 @@ constexpr std::array<Method, 22> methods{{
     {Request::PROTOCOL_ENDPOINT_EVENT, "protocolEndpointEvent", protocolEndpointEvent, false},
 }};
 
+/// @throws Failure UnsupportedVersion, UnknownMethod
+Method const &requireMethod(Core &core, CallPtr const &call, Request::Reader request) {
+    if (request.getVersion() != Wire::PROTOCOL_VERSION) {
+        throw Failure(ErrorCode::UnsupportedVersion,
+                      fmt::format("the request speaks version {} of the protocol; this daemon speaks version {}",
+                                  request.getVersion(), Wire::PROTOCOL_VERSION));
+    }
+    Method const *const method = methodOf(request);
+    if (method == nullptr) {
+        throw Failure(ErrorCode::UnknownMethod, fmt::format("this daemon does not know the request with number {}",
+                                                            static_cast<unsigned>(request.which())));
+    }
+    if (core.log.shows(LogLevel::Verbose)) {
+        core.log.write(LogLevel::Verbose, call->trace, fmt::format("request {}", method->name));
+    }
+    return *method;
+}
+
 } // namespace
 
 Method const *methodOf(Request::Reader request) {
@@ -51,23 +70,16 @@ Method const *methodOf(Request::Reader request) {
     return found == methods.end() ? nullptr : found;
 }
 
-Answer<ReplyPtr> dispatch(Core &core, CallPtr const &call, Request::Reader request) {
-    return attempt([&]() -> Answer<ReplyPtr> {
-        if (request.getVersion() != Wire::PROTOCOL_VERSION) {
-            throw Failure(ErrorCode::UnsupportedVersion,
-                          fmt::format("the request speaks version {} of the protocol; this daemon speaks version {}",
-                                      request.getVersion(), Wire::PROTOCOL_VERSION));
+Dispatched dispatch(Core &core, CallPtr const &call, Request::Reader request) {
+    try {
+        Method const &method = requireMethod(core, call, request);
+        if (auto const *prompt = std::get_if<PromptHandler>(&method.handler)) {
+            return Outcome<ReplyPtr>((*prompt)(core, call, request));
         }
-        Method const *const method = methodOf(request);
-        if (method == nullptr) {
-            throw Failure(ErrorCode::UnknownMethod, fmt::format("this daemon does not know the request with number {}",
-                                                                static_cast<unsigned>(request.which())));
-        }
-        if (core.log.shows(LogLevel::Verbose)) {
-            core.log.write(LogLevel::Verbose, call->trace, fmt::format("request {}", method->name));
-        }
-        return method->handler(core, call, request);
-    });
+        return std::get<Handler>(method.handler)(core, call, request);
+    } catch (Failure const &failure) {
+        return Outcome<ReplyPtr>(failure);
+    }
 }
 
 } // namespace Lumod

@@ -1,50 +1,99 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "MessageReader.h"
 
+#include <algorithm>
+
+#include "wire/Failure.h"
 #include "wire/Limits.h"
 
 namespace Lumod {
 
-using Wire::ErrorCode;
-using Wire::Failure;
 using Wire::SegmentTable;
 
-Answer<bool> MessageReader::next() {
-    return stream_.tryRead(table_.data(), 1, SegmentTable::prefixBytes).then([this](std::size_t have) -> Answer<bool> {
-        if (have == 0) {
-            return Outcome<bool>(false);
+namespace {
+
+/// A buffer that grew for a long request is given back after it.
+constexpr std::size_t keptBufferBytes = std::size_t{64} << 10;
+
+} // namespace
+
+MessageReader::Progress MessageReader::advance() {
+    for (;;) {
+        if (!isLong_ && messageBytes_ == 0) {
+            look();
         }
-        // One deadline for the whole message: a byte now and then does not move it.
-        auto tooSlow = timer_.afterDelay(patience).then([]() -> Outcome<bool> {
-            return Failure(ErrorCode::DeadlineExceeded, "a request was begun and not finished in time");
-        });
-        return readMessage(have).exclusiveJoin(kj::mv(tooSlow));
-    });
-}
-
-Answer<bool> MessageReader::readMessage(std::size_t have) {
-    auto prefix = readExactly(table_.data() + have, SegmentTable::prefixBytes - have);
-    auto table = andThen(kj::mv(prefix), [this](Done) {
-        std::size_t const bytes = SegmentTable::bytesOf(table_.data());
-        return readExactly(table_.data() + SegmentTable::prefixBytes, bytes - SegmentTable::prefixBytes);
-    });
-    auto body = andThen(kj::mv(table), [this](Done) {
-        kj::ArrayPtr<kj::byte> place = buffer_.prepare(SegmentTable(table_.data(), Wire::requestBytesMax));
-        return readExactly(place.begin(), place.size());
-    });
-    return andThen(kj::mv(body), [](Done) { return true; });
-}
-
-Answer<Done> MessageReader::readExactly(std::uint8_t *place, std::size_t bytes) {
-    if (bytes == 0) {
-        return Outcome<Done>(Done{});
+        if (isWhole()) {
+            return Progress::Whole;
+        }
+        if (receive() > 0) {
+            continue;
+        }
+        if (!socket_.isOver()) {
+            return Progress::Waiting;
+        }
+        if (hasBegun()) {
+            throw Wire::Failure(Wire::ErrorCode::ConnectionLost,
+                                "the peer closed the connection in the middle of a request");
+        }
+        return Progress::Closed;
     }
-    return stream_.tryRead(place, bytes, bytes).then([bytes](std::size_t got) -> Outcome<Done> {
-        if (got < bytes) {
-            return Failure(ErrorCode::ConnectionLost, "the peer closed the connection in the middle of a request");
+}
+
+void MessageReader::look() {
+    if (have_ < SegmentTable::prefixBytes) {
+        return;
+    }
+    std::size_t const tableBytes = SegmentTable::bytesOf(front_.data());
+    if (have_ < tableBytes) {
+        return;
+    }
+    SegmentTable const table(front_.data(), Wire::requestBytesMax);
+    std::size_t const bytes = tableBytes + table.bodyBytes();
+    if (bytes > front_.size() || table.segmentCount() > 1) {
+        moveToBuffer(table, tableBytes);
+    } else if (bytes <= have_) {
+        messageBytes_ = bytes;
+        onlySegment_ =
+            kj::arrayPtr(reinterpret_cast<capnp::word const *>(front_.data() + tableBytes), table.segmentWords(0));
+    }
+}
+
+void MessageReader::moveToBuffer(SegmentTable const &table, std::size_t tableBytes) {
+    kj::ArrayPtr<kj::byte> body = buffer_.prepare(table);
+    std::size_t const here = std::min(have_ - tableBytes, body.size());
+    std::copy_n(front_.data() + tableBytes, here, body.begin());
+    removeFront(tableBytes + here);
+    missing_ = body.slice(here, body.size());
+    isLong_ = true;
+}
+
+std::size_t MessageReader::receive() {
+    std::size_t got = 0;
+    if (isLong_) {
+        got = socket_.receive(missing_.begin(), missing_.size());
+        missing_ = missing_.slice(got, missing_.size());
+    } else {
+        got = socket_.receive(front_.data() + have_, front_.size() - have_);
+        have_ += got;
+    }
+    return got;
+}
+
+void MessageReader::removeFront(std::size_t bytes) {
+    std::copy(front_.data() + bytes, front_.data() + have_, front_.data());
+    have_ -= bytes;
+}
+
+void MessageReader::drop() {
+    if (isLong_) {
+        isLong_ = false;
+        if (buffer_.capacityBytes() > keptBufferBytes) {
+            buffer_.release();
         }
-        return Done{};
-    });
+    } else {
+        removeFront(messageBytes_);
+        messageBytes_ = 0;
+    }
 }
 
 } // namespace Lumod

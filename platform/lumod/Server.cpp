@@ -119,10 +119,8 @@ private:
             sayWhyNot(client.get(), refusal(peer));
             return;
         }
-        using Flags = kj::LowLevelAsyncIoProvider;
-        auto stream =
-            io_.lowLevelProvider->wrapSocketFd(kj::mv(client), Flags::ALREADY_CLOEXEC | Flags::ALREADY_NONBLOCK);
-        auto connection = kj::heap<Connection>(core_, shutdown_, kj::mv(stream), ordered, ++lastNumber_);
+        auto connection = kj::heap<Connection>(core_, shutdown_, replyRoom_, io_.unixEventPort, kj::mv(client), ordered,
+                                               ++lastNumber_);
         ++count_;
         auto served = kj::evalLater([connection = connection.get()] { return connection->run(); });
         connections_.add(served.attach(kj::mv(connection), kj::defer([this] { --count_; })));
@@ -146,6 +144,7 @@ private:
     kj::AsyncIoContext &io_;
     Admission admission_;
     Shutdown shutdown_;
+    ReplyRoom replyRoom_;
     uint64_t lastNumber_ = 0;
     std::size_t count_ = 0;
     bool isShort_ = false;

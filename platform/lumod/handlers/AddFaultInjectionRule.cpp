@@ -5,7 +5,7 @@
 
 namespace Lumod {
 
-Answer<ReplyPtr> addFaultInjectionRule(Core &core, CallPtr const &call, Wire::Request::Reader request) {
+ReplyPtr addFaultInjectionRule(Core &core, CallPtr const &call, Wire::Request::Reader request) {
     Wire::FaultInjectionRule::Reader const rule = request.getAddFaultInjectionRule();
     std::string const fault = textOf(rule.getFault());
     std::string const operation = textOf(rule.getOperation());
@@ -13,7 +13,7 @@ Answer<ReplyPtr> addFaultInjectionRule(Core &core, CallPtr const &call, Wire::Re
     core.log.write(LogLevel::Info, call->trace,
                    fmt::format("added the fault rule {} for {}: frequency {}, time {} ms", fault, operation,
                                rule.getFrequency(), rule.getTimeMs()));
-    return Outcome<ReplyPtr>(doneReply());
+    return doneReply();
 }
 
 } // namespace Lumod

@@ -5,7 +5,7 @@
 
 namespace Lumod {
 
-Answer<ReplyPtr> modifyFaultInjectionRule(Core &core, CallPtr const &call, Wire::Request::Reader request) {
+ReplyPtr modifyFaultInjectionRule(Core &core, CallPtr const &call, Wire::Request::Reader request) {
     Wire::FaultInjectionRule::Reader const rule = request.getModifyFaultInjectionRule();
     std::string const fault = textOf(rule.getFault());
     std::string const operation = textOf(rule.getOperation());
@@ -15,7 +15,7 @@ Answer<ReplyPtr> modifyFaultInjectionRule(Core &core, CallPtr const &call, Wire:
                        ? fmt::format("removed the fault rule {} for {}", fault, operation)
                        : fmt::format("changed the fault rule {} for {}: frequency {}, time {} ms", fault, operation,
                                      rule.getFrequency(), rule.getTimeMs()));
-    return Outcome<ReplyPtr>(doneReply());
+    return doneReply();
 }
 
 } // namespace Lumod

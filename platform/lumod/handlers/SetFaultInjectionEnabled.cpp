@@ -3,12 +3,12 @@
 
 namespace Lumod {
 
-Answer<ReplyPtr> setFaultInjectionEnabled(Core &core, CallPtr const &call, Wire::Request::Reader request) {
+ReplyPtr setFaultInjectionEnabled(Core &core, CallPtr const &call, Wire::Request::Reader request) {
     bool const enabled = request.getSetFaultInjectionEnabled();
     core.faults.setEnabled(enabled);
     core.log.write(LogLevel::Warning, call->trace,
                    enabled ? "fault injection is enabled" : "fault injection is disabled");
-    return Outcome<ReplyPtr>(doneReply());
+    return doneReply();
 }
 
 } // namespace Lumod

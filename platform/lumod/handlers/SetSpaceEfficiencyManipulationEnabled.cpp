@@ -3,13 +3,13 @@
 
 namespace Lumod {
 
-Answer<ReplyPtr> setSpaceEfficiencyManipulationEnabled(Core &core, CallPtr const &call, Wire::Request::Reader request) {
+ReplyPtr setSpaceEfficiencyManipulationEnabled(Core &core, CallPtr const &call, Wire::Request::Reader request) {
     bool const enabled = request.getSetSpaceEfficiencyManipulationEnabled();
     core.services.modifiesProfiles = enabled;
     core.log.write(LogLevel::Info, call->trace,
                    enabled ? "storage profiles are modified for space efficiency"
                            : "storage profiles are left as they are given");
-    return Outcome<ReplyPtr>(doneReply());
+    return doneReply();
 }
 
 } // namespace Lumod

@@ -2,6 +2,8 @@
 #include <algorithm>
 #include <cstring>
 
+#include <sys/socket.h>
+
 #include <capnp/any.h>
 #include <gmock/gmock.h>
 
@@ -53,6 +55,93 @@ TEST_F(ConnectionTest, AnswersRequestsOfOneConnectionInOrder) {
     EXPECT_EQ(parsed(*client.takeMessage()).id, 1U);
     EXPECT_EQ(parsed(*client.takeMessage()).id, 1U);
     EXPECT_EQ(parsed(*client.takeMessage()).id, 2U);
+}
+
+TEST_F(ConnectionTest, RequestsThatComeTogetherAreAnsweredInOrder) {
+    RawClient client(orderedPath());
+    std::string bytes;
+    for (uint64_t id = 1; id <= 100; ++id) {
+        // So that they end at every place of what is received at once.
+        bytes += framed([id](auto request) { request.setTraceId(std::string(id * 7, 't').c_str()); }, id);
+    }
+    EXPECT_EQ(client.send(bytes), bytes.size());
+    turn();
+    for (uint64_t id = 1; id <= 100; ++id) {
+        auto const message = client.takeMessage();
+        ASSERT_TRUE(message.has_value()) << id;
+        EXPECT_EQ(parsed(*message).id, id);
+    }
+    EXPECT_FALSE(client.takeMessage().has_value());
+}
+
+TEST_F(ConnectionTest, RequestsAreReadWhereverTheyAreCut) {
+    for (std::size_t const length : {0U, 300U, 380U, 400U, 410U, 420U, 430U, 440U, 450U, 500U, 5000U}) {
+        std::string const request =
+            framed([length](auto builder) { builder.setTraceId(std::string(length, 't').c_str()); }, 1);
+        for (std::size_t const cut : {1U, 7U, 8U, 9U, 100U, 511U, 512U, 513U, 4000U}) {
+            if (cut >= request.size()) {
+                continue;
+            }
+            RawClient client(orderedPath());
+            client.send(request.substr(0, cut));
+            turn();
+            EXPECT_FALSE(client.takeMessage().has_value());
+            // The next one comes with the rest.
+            client.send(request.substr(cut) + framed(ping, 2));
+            turn();
+            for (uint64_t const id : {1U, 2U}) {
+                auto const message = client.takeMessage();
+                ASSERT_TRUE(message.has_value()) << length << " cut at " << cut;
+                EXPECT_EQ(parsed(*message).id, id) << length << " cut at " << cut;
+            }
+        }
+    }
+}
+
+TEST_F(ConnectionTest, AShortRequestMayHaveSegments) {
+    capnp::MallocMessageBuilder message(1, capnp::AllocationStrategy::FIXED_SIZE);
+    auto request = message.initRoot<Wire::Request>();
+    request.setVersion(Wire::PROTOCOL_VERSION);
+    request.setId(8);
+    request.setTraceId("a trace id in a segment of its own");
+    request.setPing();
+    ASSERT_GT(message.getSegmentsForOutput().size(), 1U);
+    RawClient client(orderedPath());
+    client.send(framedMessage(message) + framed(ping, 9));
+    turn();
+    EXPECT_EQ(parsed(*client.takeMessage()).id, 8U);
+    EXPECT_EQ(parsed(*client.takeMessage()).id, 9U);
+}
+
+TEST_F(ConnectionTest, AnswersThatArePartlyTakenAreSentOn) {
+    constexpr uint64_t requests = 5000;
+    RawClient client(orderedPath());
+    std::string bytes;
+    for (uint64_t id = 1; id <= requests; ++id) {
+        bytes += framed(ping, id);
+    }
+    uint64_t answered = 0;
+    while (answered < requests) {
+        bytes.erase(0, client.send(bytes));
+        turn(); // until the socket takes no more answers
+        uint64_t const before = answered;
+        while (auto const message = client.takeMessage()) {
+            ASSERT_EQ(parsed(*message).id, ++answered);
+        }
+        ASSERT_GT(answered, before);
+    }
+    EXPECT_EQ(ask(client, framed(ping, 7)).id, 7U);
+}
+
+TEST_F(ConnectionTest, APeerThatSaysNoMoreIsAnswered) {
+    RawClient client(orderedPath());
+    client.send(framed(ping, 1) + framed(ping, 2));
+    ASSERT_EQ(::shutdown(client.fd(), SHUT_WR), 0);
+    turn();
+    EXPECT_EQ(parsed(*client.takeMessage()).id, 1U);
+    EXPECT_EQ(parsed(*client.takeMessage()).id, 2U);
+    EXPECT_TRUE(client.isClosed());
+    EXPECT_FALSE(sink_.holds("closed connection"));
 }
 
 TEST_F(ConnectionTest, fault_17_ImpossibleLengthsCloseTheConnection) {

@@ -85,8 +85,10 @@ Pending DaemonFixture::start(Fill const &fill, bool ordered, std::string const &
     root.setVersion(Wire::PROTOCOL_VERSION);
     fill(root);
     auto const call = std::make_shared<Lumod::Call const>(Lumod::Call{trace, timer_.now() + 30 * kj::SECONDS, ordered});
-    auto promise = Lumod::dispatch(daemon_->core(), call, root.asReader());
-    return {std::move(request), kj::mv(promise)};
+    auto dispatched = Lumod::dispatch(daemon_->core(), call, root.asReader());
+    auto *const outcome = std::get_if<Lumod::Outcome<Lumod::ReplyPtr>>(&dispatched);
+    return {std::move(request), outcome != nullptr ? Lumod::Answer<Lumod::ReplyPtr>(std::move(*outcome))
+                                                   : std::get<Lumod::Answer<Lumod::ReplyPtr>>(std::move(dispatched))};
 }
 
 Reply DaemonFixture::finish(Pending pending) {
