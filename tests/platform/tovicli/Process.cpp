@@ -44,6 +44,12 @@ TEST_F(Process, RunsACommandOfAPlugin) {
     EXPECT_EQ(errors(), "");
 }
 
+TEST_F(Process, LosesNothingThatAPluginPrintsByItself) {
+    EXPECT_EQ(run({"storage", "sample", "print"}), 0);
+    EXPECT_EQ(output(), "42\nprinted without the tool\n");
+    EXPECT_EQ(errors(), "");
+}
+
 TEST_F(Process, fault_6_ClosedDescriptorsAreOccupiedBeforeAnythingIsOpened) {
     auto const closeBoth = [] {
         close(STDIN_FILENO);

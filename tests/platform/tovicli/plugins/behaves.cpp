@@ -2,6 +2,7 @@
 //
 // Registers "storage sample" with commands that show what the process around them is like.
 #include <csignal>
+#include <cstdio>
 #include <cstdlib>
 #include <fcntl.h>
 #include <unistd.h>
@@ -71,6 +72,16 @@ public:
     }
 };
 
+/// Answers 42 and prints by itself, into a buffer of the process.
+class Print : public virtual Answer {
+public:
+    void ExecuteInternal(boost::shared_ptr<CallSpec::Input> const &input,
+                         boost::shared_ptr<CallSpec::Output> const &output) override {
+        std::printf("printed without the tool\n");
+        Answer::ExecuteInternal(input, output);
+    }
+};
+
 } // namespace
 
 void AutoCli_RegisterNamespaces(boost::shared_ptr<AutoCli::Namespace> &root) {
@@ -78,5 +89,6 @@ void AutoCli_RegisterNamespaces(boost::shared_ptr<AutoCli::Namespace> &root) {
     sample->RegisterNamespaceNode(boost::make_shared<NextDescriptor>(), "descriptor");
     sample->RegisterNamespaceNode(boost::make_shared<Interrupt>(), "interrupt");
     sample->RegisterNamespaceNode(boost::make_shared<Answer>(), "answer");
+    sample->RegisterNamespaceNode(boost::make_shared<Print>(), "print");
     sample->RegisterNamespaceNode(boost::make_shared<Wait>(), "wait");
 }
