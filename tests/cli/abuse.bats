@@ -74,6 +74,16 @@ setup() {
     done
 }
 
+@test "a request whose sending is interrupted is sent all the same" {
+    host_up
+    register_provider
+    status=0
+    traced -qq -o "$BATS_TEST_TMPDIR/trace" -e trace=sendmsg -e inject=sendmsg:error=EINTR:when=1 \
+        tovicli storage internal lumo faultInjection enable --enabled true >"$out" 2>"$err" || status=$?
+    expect_done $'true\n'
+    [ "$(grep -c "EINTR.*INJECTED" "$BATS_TEST_TMPDIR/trace")" = 1 ]
+}
+
 @test "fault_63 a reader that went away" {
     host_up
     register_provider
