@@ -56,16 +56,16 @@ private:
     int descriptor_ = open("/dev/null", O_WRONLY);
 };
 
-std::string const &text(MetaStruct const &row, std::size_t field) {
-    return static_cast<MetaString const &>(*row.ViewFields()[field].value).ViewValue();
+std::string_view text(MetaStruct const &row, std::size_t field) {
+    return static_cast<MetaString const &>(*row.ViewFields().value(field)).ViewValue();
 }
 
 int64_t number(MetaStruct const &row, std::size_t field) {
-    return static_cast<MetaInt const &>(*row.ViewFields()[field].value).GetValue();
+    return static_cast<MetaInt const &>(*row.ViewFields().value(field)).GetValue();
 }
 
 bool truth(MetaStruct const &row, std::size_t field) {
-    return static_cast<MetaBool const &>(*row.ViewFields()[field].value).GetValue();
+    return static_cast<MetaBool const &>(*row.ViewFields().value(field)).GetValue();
 }
 
 /// What a careful hand writes: a buffer, handed on when it is full.
@@ -136,7 +136,7 @@ private:
     }
 
     /// Texts of other bytes do not occur in these rows; finding that out is part of the work.
-    static bool isHarmless(std::string const &text) {
+    static bool isHarmless(std::string_view text) {
         static std::array<bool, 256> const harmless = [] {
             std::array<bool, 256> table{};
             std::fill(table.begin() + ' ', table.begin() + '\x7F', true);
@@ -146,14 +146,14 @@ private:
         return std::all_of(text.begin(), text.end(), [](char c) { return harmless[static_cast<unsigned char>(c)]; });
     }
 
-    static std::size_t width(std::string const &text) {
+    static std::size_t width(std::string_view text) {
         if (!isHarmless(text)) {
             std::abort();
         }
         return text.size();
     }
 
-    void jsonText(std::string const &text) {
+    void jsonText(std::string_view text) {
         if (!isHarmless(text)) {
             std::abort();
         }
@@ -167,8 +167,8 @@ private:
         buffer_.append(text, std::to_chars(text, text + sizeof(text), value).ptr);
     }
 
-    void line(std::string const &name, std::size_t nameWidth, std::string const &id, std::size_t idWidth,
-              std::string const &size, std::size_t sizeWidth, std::string const &url, std::size_t urlWidth,
+    void line(std::string_view name, std::size_t nameWidth, std::string_view id, std::size_t idWidth,
+              std::string_view size, std::size_t sizeWidth, std::string_view url, std::size_t urlWidth,
               char const *ready) {
         buffer_ += name;
         buffer_.append(nameWidth - width(name) + 2, ' ');

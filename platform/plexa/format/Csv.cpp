@@ -155,7 +155,7 @@ private:
         }
     }
 
-    void text(std::string const &text) {
+    void text(std::string_view text) {
         if (!text.empty() && std::all_of(text.begin(), text.end(), isPlain)) {
             // A reader may take blanks at a cell's ends away.
             bool const blanks = text.front() == ' ' || text.back() == ' ';

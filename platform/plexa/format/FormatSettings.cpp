@@ -49,8 +49,8 @@ void gather(Object const &schema, Structures &structures, std::size_t depth = 0)
         gather(list->GetElementSchema(), structures, depth + 1);
     } else if (auto const structure = boost::dynamic_pointer_cast<MetaObj::MetaStruct>(schema)) {
         structures.emplace(structure->GetName(), structure->GetFieldNames());
-        for (MetaObj::MetaStruct::Field const &field : structure->ViewFields()) {
-            gather(field.value, structures, depth + 1);
+        for (std::string const &field : structure->GetFieldNames()) {
+            gather(structure->GetField(field), structures, depth + 1);
         }
     }
 }
@@ -189,7 +189,7 @@ std::string FormatSettings::header(MetaObj::MetaStruct const &structure) const {
             break;
         }
         text += pattern->substr(position, begin - position);
-        text += scalarText(structure.GetField(pattern->substr(begin + 1, end - begin - 1)).get());
+        text += scalarText(findValue(structure.ViewFields(), pattern->substr(begin + 1, end - begin - 1)));
         position = end + 1;
     }
     return text + pattern->substr(position);

@@ -40,7 +40,7 @@ public:
         auto const [end, error] = std::to_chars(digits, digits + sizeof(digits), value);
         put(std::string_view(digits, static_cast<std::size_t>(end - digits)));
     }
-    void text(std::string const &value) {
+    void text(std::string_view value) {
         writeJsonText(out_, value);
     }
     void beginList(std::size_t) {

@@ -58,7 +58,7 @@ public:
         out_.number(value);
         out_.put('\n');
     }
-    void text(std::string const &value) {
+    void text(std::string_view value) {
         path();
         writeJsonText(out_, value);
         out_.put('\n');

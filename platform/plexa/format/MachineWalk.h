@@ -3,7 +3,7 @@
 // The walk that all formats for programs share: which values there are, in which order, under which names. What a
 // format adds is its writer, which is told of one piece after the other:
 //
-//   unset() boolean(bool) number(int64_t) text(std::string const &)
+//   unset() boolean(bool) number(int64_t) text(std::string_view)
 //   beginList(count)   element(index) and a value, for each   endList(count)
 //   beginStruct(structure, count)   field(plan, index) and a value, for each   endStruct(count)
 //   static std::string label(name)      a field's name as the format writes it; made once for a list

@@ -49,9 +49,12 @@ bool isSame(std::string const &left, std::string const &right) {
     return true;
 }
 
-bool haveNames(std::vector<MetaStruct::Field> const &fields, std::vector<std::string> const &names) {
-    return std::equal(fields.begin(), fields.end(), names.begin(), names.end(),
-                      [](MetaStruct::Field const &field, std::string const &name) { return isSame(field.name, name); });
+bool haveNames(MetaStruct::Fields const &fields, std::vector<std::string> const &names) {
+    bool same = fields.size() == names.size();
+    for (std::size_t i = 0; same && i < names.size(); ++i) {
+        same = isSame(fields.name(i), names[i]);
+    }
+    return same;
 }
 
 /// Walks through a result and remembers the field it is in.
@@ -72,11 +75,7 @@ public:
             }
             break;
         case ValueType::Struct:
-            for (MetaStruct::Field const &field : as<MetaStruct>(value).ViewFields()) {
-                std::string const *const around = std::exchange(field_, &field.name);
-                check(field.value.get(), depth + 1);
-                field_ = around;
-            }
+            structure(as<MetaStruct>(value).ViewFields(), depth);
             break;
         case ValueType::Unknown:
             refuse(format_, field_, isOfUnknownKind);
@@ -86,6 +85,14 @@ public:
     }
 
 private:
+    void structure(MetaStruct::Fields const &fields, std::size_t depth) {
+        for (std::size_t i = 0; i < fields.size(); ++i) {
+            std::string const *const around = std::exchange(field_, &fields.name(i));
+            check(fields.value(i), depth + 1);
+            field_ = around;
+        }
+    }
+
     std::string const &format_;
     std::string const *field_;
 };
@@ -124,7 +131,7 @@ bool isSet(Object const &value) {
 std::string scalarText(MetaObject const *value) {
     switch (typeOf(value)) {
     case ValueType::Text:
-        return as<MetaString>(value).ViewValue();
+        return as<MetaString>(value).GetValue();
     case ValueType::Number:
         return std::to_string(as<MetaInt>(value).GetValue());
     case ValueType::Boolean:
@@ -148,17 +155,21 @@ void checkShape(MetaObject const *value, std::string const &format, std::string 
     ShapeCheck(format, field).check(value, 0);
 }
 
-MetaObject const *findValue(MetaStruct const &structure, FieldPlan const &field) {
-    std::vector<MetaStruct::Field> const &fields = structure.ViewFields();
-    if (field.index < fields.size() && isSame(fields[field.index].name, field.name)) {
-        return fields[field.index].value.get();
-    }
-    for (MetaStruct::Field const &candidate : fields) {
-        if (candidate.name == field.name) {
-            return candidate.value.get();
+MetaObject const *findValue(MetaStruct::Fields const &fields, std::string const &name) {
+    for (std::size_t i = 0; i < fields.size(); ++i) {
+        if (fields.name(i) == name) {
+            return fields.value(i);
         }
     }
     return nullptr;
+}
+
+MetaObject const *findValue(MetaStruct const &structure, FieldPlan const &field) {
+    MetaStruct::Fields const fields = structure.ViewFields();
+    if (field.index < fields.size() && isSame(fields.name(field.index), field.name)) {
+        return fields.value(field.index);
+    }
+    return findValue(fields, field.name);
 }
 
 void merge(StructurePlan &plan, StructurePlan const &more) {
@@ -182,8 +193,13 @@ std::shared_ptr<StructurePlan const> StructurePlans::planOf(MetaStruct const &st
         lastSchema_ = schema;
     }
     Known &known = *last_;
-    bool const isKnown = known.plan != nullptr && haveNames(structure.ViewFields(), known.names) &&
+    MetaStruct::Fields const fields = structure.ViewFields();
+    if (known.plan != nullptr && schema != nullptr && fields.sharesNames(known.shared)) {
+        return known.plan;
+    }
+    bool const isKnown = known.plan != nullptr && haveNames(fields, known.names) &&
                          (schema != nullptr || known.structure == structure.GetName());
+    known.shared = fields.names();
     if (!isKnown) {
         known.structure = structure.GetName();
         known.names = structure.GetFieldNames();
@@ -198,14 +214,15 @@ StructurePlan StructurePlans::made(MetaStruct const &structure, MetaObject const
     StructurePlan plan;
     std::map<std::string, std::size_t> places; // of the plan's fields
     if (isDeclared) {
-        for (MetaStruct::Field const &field : as<MetaStruct>(schema).ViewFields()) {
-            places.emplace(field.name, plan.size());
-            plan.push_back({field.name, field.value, settings_.unit(name, field.name), label_(field.name)});
+        auto const &declared = as<MetaStruct>(schema);
+        for (std::string const &field : declared.GetFieldNames()) {
+            places.emplace(field, plan.size());
+            plan.push_back({field, declared.GetField(field), settings_.unit(name, field), label_(field)});
         }
     }
-    std::vector<MetaStruct::Field> const &fields = structure.ViewFields();
+    MetaStruct::Fields const fields = structure.ViewFields();
     for (std::size_t i = 0; i < fields.size(); ++i) {
-        std::string const &field = fields[i].name;
+        std::string const &field = fields.name(i);
         auto const [place, isNew] = places.emplace(field, plan.size());
         if (isNew) {
             plan.push_back({field, Object(), settings_.unit(name, field), label_(field)});

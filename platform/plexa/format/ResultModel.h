@@ -104,8 +104,11 @@ using StructurePlan = std::vector<FieldPlan>;
 
 /// The value of a planned field; null when the structure has none.
 inline MetaObj::MetaObject const *valueOf(MetaObj::MetaStruct const &structure, FieldPlan const &field) {
-    return field.index == FieldPlan::nowhere ? nullptr : structure.ViewFields()[field.index].value.get();
+    return field.index == FieldPlan::nowhere ? nullptr : structure.ViewFields().value(field.index);
 }
+
+/// The value of a field; null when there is none of that name.
+MetaObj::MetaObject const *findValue(MetaObj::MetaStruct::Fields const &fields, std::string const &name);
 
 /// The same for a structure that the plan may not have been made for.
 MetaObj::MetaObject const *findValue(MetaObj::MetaStruct const &structure, FieldPlan const &field);
@@ -134,6 +137,7 @@ private:
     struct Known {
         std::string structure; ///< name of the value that the plan was made for
         std::vector<std::string> names;
+        void const *shared = nullptr; ///< the names themselves; other structures may share them
         std::shared_ptr<StructurePlan const> plan;
     };
 

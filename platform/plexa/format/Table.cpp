@@ -36,6 +36,28 @@ struct Layout {
     bool isUniform = true;       ///< every row holds the same fields in the same places
 };
 
+/// The structures of a list, or one alone.
+class Rows {
+public:
+    explicit Rows(std::vector<Object> const &elements)
+        : elements_(elements.data())
+        , size_(elements.size()) {}
+    explicit Rows(MetaStruct const &one)
+        : one_(&one)
+        , size_(1) {}
+    std::size_t size() const {
+        return size_;
+    }
+    MetaObject const *operator[](std::size_t place) const {
+        return elements_ != nullptr ? elements_[place].get() : one_;
+    }
+
+private:
+    Object const *elements_ = nullptr;
+    MetaObject const *one_ = nullptr;
+    std::size_t size_;
+};
+
 bool isCollection(MetaObject const *value) {
     ValueType const type = typeOf(value);
     return type == ValueType::List || type == ValueType::Struct;
@@ -56,7 +78,7 @@ Shown shown(MetaObject const *value, std::string const &unit, std::string &room)
         return {};
     }
     if (type == ValueType::Text && unit.empty() && isPlainAscii(as<MetaString>(value).ViewValue())) {
-        std::string const &text = as<MetaString>(value).ViewValue();
+        std::string_view const text = as<MetaString>(value).ViewValue();
         return {text, text.size()};
     }
     if (type == ValueType::Boolean && unit.empty()) {
@@ -98,7 +120,7 @@ public:
         if (typeOf(result.value.get()) != ValueType::List) {
             checkShape(result.value.get(), format);
         }
-        value(result.value, result.schema.get(), true, 0);
+        value(result.value.get(), result.schema.get(), true, 0);
     }
 
 private:
@@ -107,19 +129,19 @@ private:
     }
 
     /// What stands on lines of its own: a table, or values one below the other.
-    void value(Object const &value, MetaObject const *schema, bool outermost, std::size_t indent) {
-        switch (typeOf(value.get())) {
+    void value(MetaObject const *value, MetaObject const *schema, bool outermost, std::size_t indent) {
+        switch (typeOf(value)) {
         case ValueType::Unset:
             break;
         case ValueType::Struct:
-            static_cast<void>(table({value}, schema, outermost, indent));
+            static_cast<void>(table(Rows(as<MetaStruct>(value)), schema, outermost, indent));
             break;
         case ValueType::List:
-            list(as<MetaList>(value.get()), schema, outermost, indent);
+            list(as<MetaList>(value), schema, outermost, indent);
             break;
         default:
             out_.fill(indent, ' ');
-            out_.print(shown(value.get(), std::string(), room_).text, "\n");
+            out_.print(shown(value, std::string(), room_).text, "\n");
         }
     }
 
@@ -127,17 +149,17 @@ private:
         Object const element = elementSchema(&list, schema);
         std::vector<Object> const &elements = list.ViewElements();
         bool const isDeclared = typeOf(element.get()) == ValueType::Struct;
-        if ((!elements.empty() || isDeclared) && table(elements, element.get(), outermost, indent)) {
+        if ((!elements.empty() || isDeclared) && table(Rows(elements), element.get(), outermost, indent)) {
             return;
         }
         checkShape(&list, format);
         for (Object const &each : elements) {
-            value(each, element.get(), outermost, isCollection(each.get()) ? indent + step : indent);
+            value(each.get(), element.get(), outermost, isCollection(each.get()) ? indent + step : indent);
         }
     }
 
     /// @return false, and nothing is written, when a row is no structure
-    bool table(std::vector<Object> const &rows, MetaObject const *schema, bool outermost, std::size_t indent) {
+    bool table(Rows const &rows, MetaObject const *schema, bool outermost, std::size_t indent) {
         Layout layout;
         if (!findColumns(rows, schema, outermost ? outermost_ : nested_, layout)) {
             return false;
@@ -147,8 +169,8 @@ private:
             fitColumns(columns, settings_.display().width - std::min(settings_.display().width, indent));
         }
         heading(columns, indent);
-        for (Object const &row : rows) {
-            auto const &structure = as<MetaStruct>(row.get());
+        for (std::size_t place = 0; place < rows.size(); ++place) {
+            auto const &structure = as<MetaStruct>(rows[place]);
             bool const isFlat = printRow(structure, layout, indent);
             for (std::size_t i = 0; !isFlat && i < columns.size(); ++i) {
                 if (needsRoomOfItsOwn(findValue(structure, columns[i].field))) {
@@ -163,17 +185,17 @@ private:
     }
 
     /// The walk for the widths. A row may hold fields that no row before it has.
-    bool findColumns(std::vector<Object> const &rows, MetaObject const *schema, StructurePlans &plans, Layout &layout) {
-        if (rows.empty()) {
+    bool findColumns(Rows const &rows, MetaObject const *schema, StructurePlans &plans, Layout &layout) {
+        if (rows.size() == 0) {
             addColumns(*plans.planOf(as<MetaStruct>(schema), schema), layout);
         }
         std::shared_ptr<StructurePlan const> first;
         std::shared_ptr<StructurePlan const> last;
-        for (Object const &row : rows) {
-            if (typeOf(row.get()) != ValueType::Struct) {
+        for (std::size_t place = 0; place < rows.size(); ++place) {
+            if (typeOf(rows[place]) != ValueType::Struct) {
                 return false;
             }
-            auto const &structure = as<MetaStruct>(row.get());
+            auto const &structure = as<MetaStruct>(rows[place]);
             std::shared_ptr<StructurePlan const> const plan = plans.planOf(structure, schema);
             if (plan != last) {
                 addColumns(*plan, layout);
@@ -327,10 +349,9 @@ private:
     }
 
     void below(MetaStruct const &row, FieldPlan const &field, std::size_t indent) {
-        Object const value = row.GetField(field.name);
-        bool const isEmptyList =
-            typeOf(value.get()) == ValueType::List && as<MetaList>(value.get()).ViewElements().empty();
-        if (typeOf(value.get()) == ValueType::Unset || isEmptyList) {
+        MetaObject const *const value = findValue(row, field);
+        bool const isEmptyList = typeOf(value) == ValueType::List && as<MetaList>(value).ViewElements().empty();
+        if (typeOf(value) == ValueType::Unset || isEmptyList) {
             return;
         }
         std::string const header = settings_.header(row);

@@ -169,7 +169,7 @@ public:
         out_.number(value);
         out_.append("</int>\n");
     }
-    void text(std::string const &value) {
+    void text(std::string_view value) {
         if (canHold(value)) {
             open("text", "", ">");
             writeEscaped(out_, value);

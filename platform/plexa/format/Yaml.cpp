@@ -118,7 +118,7 @@ public:
         scalar("");
         out_.number(value);
     }
-    void text(std::string const &value) {
+    void text(std::string_view value) {
         scalar("");
         writeYamlText(out_, value);
     }
