@@ -5,6 +5,7 @@
 //
 //   bench_replay record FILE checklumos CONTAINER        writes down the requests, and how many replies each one has
 //   bench_replay record FILE metadata CONTAINER UUID
+//   bench_replay record FILE containers
 //   bench_replay FILE                                    sends them and reads the replies
 //
 // All on the daemon of TOVI_ROOT.
@@ -13,23 +14,17 @@
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
-#include <fstream>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
 #include "RawSession.h"
+#include "Recording.h"
 
 namespace {
 
 using Words = std::vector<std::string>;
 
 constexpr size_t idsARequest = 10000;
-
-struct Exchange {
-    std::vector<std::byte> request;
-    size_t replyCount = 0;
-};
 
 class Recorder {
 public:
@@ -42,21 +37,12 @@ public:
     }
 
     void write(std::string const &path) const {
-        std::ofstream file(path, std::ios::binary);
-        for (Exchange const &exchange : exchanges_) {
-            size_t const head[2] = {exchange.request.size(), exchange.replyCount};
-            file.write(reinterpret_cast<char const *>(head), sizeof(head));
-            file.write(reinterpret_cast<char const *>(exchange.request.data()),
-                       static_cast<std::streamsize>(exchange.request.size()));
-        }
-        if (!file.flush()) {
-            throw std::runtime_error(path + " cannot be written");
-        }
+        Bench::writeRecording(path, exchanges_);
     }
 
 private:
     Bench::RawSession session_;
-    std::vector<Exchange> exchanges_;
+    std::vector<Bench::Exchange> exchanges_;
 };
 
 /// Which config volumes are there, and whether each can be reached.
@@ -94,27 +80,8 @@ void recordMetadata(Recorder &recorder, std::string const &container, std::strin
     });
 }
 
-size_t replay(std::string const &socket, std::string const &path) {
-    Bench::RawSession session(socket);
-    std::ifstream file(path, std::ios::binary);
-    size_t bytes = 0;
-    size_t head[2];
-    while (file.read(reinterpret_cast<char *>(head), sizeof(head))) {
-        std::vector<std::byte> request(head[0]);
-        if (!file.read(reinterpret_cast<char *>(request.data()), static_cast<std::streamsize>(request.size()))) {
-            throw std::runtime_error(path + " ends early");
-        }
-        session.prepare(std::move(request), head[1]);
-        bytes += session.ask();
-    }
-    if (bytes == 0) {
-        throw std::runtime_error(path + " holds no requests");
-    }
-    return bytes;
-}
-
 int run(Words const &words, std::string const &socket) {
-    bool const records = words.size() >= 4 && words[0] == "record";
+    bool const records = words.size() >= 3 && words[0] == "record";
     if (records && words[2] == "checklumos" && words.size() == 4) {
         Recorder recorder(socket);
         recordChecklumos(recorder, words[3]);
@@ -123,11 +90,15 @@ int run(Words const &words, std::string const &socket) {
         Recorder recorder(socket);
         recordMetadata(recorder, words[3], words[4]);
         recorder.write(words[1]);
+    } else if (records && words[2] == "containers" && words.size() == 3) {
+        Recorder recorder(socket);
+        recorder.add([](Wire::Request::Builder request) { request.setGetStorageContainer(); });
+        recorder.write(words[1]);
     } else if (words.size() == 1) {
-        replay(socket, words[0]);
+        Bench::replayRecording(socket, words[0]);
     } else {
         std::fputs("usage: TOVI_ROOT=DIR bench_replay FILE | record FILE checklumos CONTAINER | "
-                   "record FILE metadata CONTAINER UUID\n",
+                   "record FILE metadata CONTAINER UUID | record FILE containers\n",
                    stderr);
         return 2;
     }
