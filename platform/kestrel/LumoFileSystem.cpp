@@ -23,14 +23,20 @@ bool isAway(Wire::ErrorCode code) {
 
 } // namespace
 
-LumoFileSystem::LumoFileSystem(std::shared_ptr<Host> host, std::string_view name, std::string_view containerId)
-    : host_(std::move(host))
+LumoFileSystem::LumoFileSystem(FileSystemBlock &block, std::string_view name, std::string_view containerId) noexcept
+    : block_(block)
     , name_(name) {
     std::copy_n(containerId.begin(), std::min(containerId.size(), containerId_.size()), containerId_.begin());
 }
 
+void LumoFileSystem::operator delete(LumoFileSystem *fileSystem, std::destroying_delete_t) noexcept {
+    FileSystemBlock &block = fileSystem->block_;
+    fileSystem->~LumoFileSystem();
+    block.letGo();
+}
+
 std::string LumoFileSystem::GetName() {
-    return name_;
+    return std::string(name_);
 }
 
 std::string LumoFileSystem::GetId() {
@@ -60,7 +66,8 @@ void LumoFileSystem::CreateConfigLumo(std::string const &name, std::string const
                                 "the size of a config volume cannot be " + std::to_string(sizeMb) +
                                     " MB: a positive number, or 0 for the default, is expected");
         }
-        out = host_->client
+        out = host()
+                  .client
                   .createVirtualVolume({std::string(containerId()), name, policy, sizeMb, vmUuid}, channelFor(priority))
                   .uuid;
     });
@@ -68,7 +75,9 @@ void LumoFileSystem::CreateConfigLumo(std::string const &name, std::string const
 
 void LumoFileSystem::RemoveConfigLumo(std::string const &name, std::string const &uuid, std::string const & /*extra*/,
                                       bool priority) {
-    atEdge([&] { ConfigVolumes(*host_, name_, std::string(containerId()), channelFor(priority)).remove(name, uuid); });
+    atEdge([&] {
+        ConfigVolumes(host(), std::string(name_), std::string(containerId()), channelFor(priority)).remove(name, uuid);
+    });
 }
 
 void LumoFileSystem::ReservedConfigLumo(std::string const & /*first*/, std::string const & /*second*/,
@@ -80,12 +89,16 @@ void LumoFileSystem::ReservedConfigLumo(std::string const & /*first*/, std::stri
 
 void LumoFileSystem::MountConfigLumo(std::string const &name, std::string const &uuid, std::string const & /*extra*/,
                                      bool priority) {
-    atEdge([&] { ConfigVolumes(*host_, name_, std::string(containerId()), channelFor(priority)).mount(name, uuid); });
+    atEdge([&] {
+        ConfigVolumes(host(), std::string(name_), std::string(containerId()), channelFor(priority)).mount(name, uuid);
+    });
 }
 
 void LumoFileSystem::UnmountConfigLumo(std::string const &name, std::string const &uuid, std::string const & /*extra*/,
                                        bool priority) {
-    atEdge([&] { ConfigVolumes(*host_, name_, std::string(containerId()), channelFor(priority)).unmount(name, uuid); });
+    atEdge([&] {
+        ConfigVolumes(host(), std::string(name_), std::string(containerId()), channelFor(priority)).unmount(name, uuid);
+    });
 }
 
 std::vector<Gantry::Storage::LumoAccessibilityType>
@@ -97,7 +110,7 @@ LumoFileSystem::CheckLumoAccessibility(std::vector<std::string> const &lumoIds) 
         }
         accessibility.reserve(lumoIds.size());
         try {
-            for (std::uint8_t const value : host_->client.checkLumoAccessibility(std::string(containerId()), lumoIds)) {
+            for (std::uint8_t const value : host().client.checkLumoAccessibility(std::string(containerId()), lumoIds)) {
                 accessibility.push_back(static_cast<Gantry::Storage::LumoAccessibilityType>(value));
             }
         } catch (Wire::Failure const &failure) {

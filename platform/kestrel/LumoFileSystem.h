@@ -2,23 +2,23 @@
 #pragma once
 
 #include <array>
-#include <memory>
+#include <new>
 #include <string>
 #include <string_view>
 
+#include "FileSystemBlock.h"
 #include "gantry/Storage.h"
 #include "wire/ContainerId.h"
 
 namespace Kestrel {
 
-struct Host;
-
 /// A mounted container as the interface hands it out: its name, its id, and the way to the host. Small, because a host
-/// may hand out a hundred thousand of them.
+/// may hand out a hundred thousand of them. Stands in a block, behind it its name.
 class LumoFileSystem final : public Gantry::Storage::LumoFileSystem {
 public:
-    /// @param containerId canonical
-    LumoFileSystem(std::shared_ptr<Host> host, std::string_view name, std::string_view containerId);
+    ~LumoFileSystem() override = default;
+    /// The block decides when the memory goes.
+    static void operator delete(LumoFileSystem *fileSystem, std::destroying_delete_t) noexcept;
 
     std::string GetName() override;
     std::string GetId() override;
@@ -39,12 +39,20 @@ public:
     CheckLumoAccessibility(std::vector<std::string> const &lumoIds) override;
 
 private:
+    friend class FileSystemBlock;
+    /// @param name        lives as long as the block
+    /// @param containerId canonical
+    LumoFileSystem(FileSystemBlock &block, std::string_view name, std::string_view containerId) noexcept;
+
+    Host &host() const {
+        return *block_.host();
+    }
     std::string_view containerId() const {
         return {containerId_.data(), containerId_.size()};
     }
 
-    std::shared_ptr<Host> host_;
-    std::string name_;
+    FileSystemBlock &block_;
+    std::string_view name_;
     std::array<char, Wire::containerIdLength> containerId_{};
 };
 

@@ -125,9 +125,10 @@ StorageInfoImpl::~StorageInfoImpl() {
 std::vector<Gantry::Storage::LumoFileSystem *> StorageInfoImpl::GetLumoFileSystems() {
     return atEdge([this] {
         HostPointer const &host = hostOf(impl_);
+        FileSystemMaker maker(host);
         std::vector<std::unique_ptr<LumoFileSystem>> owned;
         host->store.visitFileSystems([&](std::string_view name, std::string_view containerId) {
-            owned.push_back(std::make_unique<LumoFileSystem>(host, name, containerId));
+            owned.push_back(maker.make(name, containerId));
         });
         std::vector<Gantry::Storage::LumoFileSystem *> fileSystems;
         fileSystems.reserve(owned.size());
@@ -143,7 +144,7 @@ std::vector<Gantry::Storage::LumoFileSystem *> StorageInfoImpl::GetLumoFileSyste
 Gantry::Storage::LumoFileSystem *StorageInfoImpl::AddLumoFileSystem(std::string const &name, std::string &id,
                                                                     std::vector<std::string> const &arrayIds,
                                                                     bool mount) {
-    return atEdge([&] {
+    return atEdge([&]() -> LumoFileSystem * {
         HostPointer const &host = hostOf(impl_);
         requireContainerName(name);
         std::string const containerId = requireContainerId(id);
@@ -151,7 +152,7 @@ Gantry::Storage::LumoFileSystem *StorageInfoImpl::AddLumoFileSystem(std::string 
         addToHost(*host, {name, containerId, arrayIds}, mount);
         LumoPlatform_NoteOneDone();
         id = containerId;
-        return new LumoFileSystem(host, name, containerId);
+        return FileSystemMaker::makeOne(host, name, containerId).release();
     });
 }
 
@@ -160,7 +161,8 @@ Gantry::Storage::LumoFileSystem *StorageInfoImpl::GetLumoFileSystemByPath(std::s
         HostPointer const &host = hostOf(impl_);
         auto const name = host->places.containerOf(path);
         auto const fileSystem = name ? host->store.fileSystemNamed(*name) : std::nullopt;
-        return fileSystem ? new LumoFileSystem(host, fileSystem->name, fileSystem->containerId) : nullptr;
+        return fileSystem ? FileSystemMaker::makeOne(host, fileSystem->name, fileSystem->containerId).release()
+                          : nullptr;
     });
 }
 

@@ -105,4 +105,33 @@ TEST_F(ManyContainersTest, WithoutADaemonTheNextOneFails) {
     EXPECT_EQ(namesOfFileSystems().size(), static_cast<std::size_t>(singly));
 }
 
+TEST_F(ManyContainersTest, HandedOutFileSystemsGoOneByOneInAnyOrder) {
+    // Names of every length, so that some end where a piece of memory does.
+    constexpr int count = 200;
+    exportMany(count);
+    std::vector<std::string> names;
+    for (int number = 0; number < count; ++number) {
+        std::string id = idOf(number);
+        names.push_back(std::to_string(number) + std::string(static_cast<std::size_t>(number), 'x'));
+        FileSystemPointer const made(host_->AddLumoFileSystem(names.back(), id, {}, false));
+        EXPECT_EQ(made->GetName(), names.back());
+    }
+    std::vector<FileSystemPointer> all;
+    for (auto *const fileSystem : host_->GetLumoFileSystems()) {
+        all.emplace_back(fileSystem);
+    }
+    ASSERT_EQ(all.size(), names.size());
+    host_.reset();
+    for (std::size_t place = 0; place < all.size(); place += 2) {
+        all[place].reset();
+    }
+    for (std::size_t place = all.size(); place-- > 0;) {
+        if (all[place]) {
+            EXPECT_EQ(all[place]->GetName(), names[place]);
+            EXPECT_EQ(all[place]->GetId(), idOf(static_cast<int>(place)));
+            all[place].reset();
+        }
+    }
+}
+
 } // namespace
