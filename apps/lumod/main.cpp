@@ -33,8 +33,9 @@ namespace {
 
 constexpr int exitFailure = 1;
 constexpr int exitUsage = 2;
-/// Events to run before the sockets are looked at again, so that a busy client cannot keep the others out.
-constexpr unsigned eventsBetweenPolls = 200;
+/// Events to run before the sockets are looked at again, so that busy clients cannot keep the others out. An event may
+/// be a whole request.
+constexpr unsigned eventsBetweenPolls = 32;
 
 /// A daemon that was started with closed standard descriptors must not take a database file for its stderr.
 void openStandardDescriptors() {
