@@ -113,6 +113,42 @@ TEST_F(ConnectionTest, AShortRequestMayHaveSegments) {
     EXPECT_EQ(parsed(*client.takeMessage()).id, 9U);
 }
 
+TEST_F(ConnectionTest, ATableOfSegmentsMayBeCut) {
+    capnp::MallocMessageBuilder message(1, capnp::AllocationStrategy::FIXED_SIZE);
+    auto request = message.initRoot<Wire::Request>();
+    request.setVersion(Wire::PROTOCOL_VERSION);
+    request.setId(8);
+    request.setTraceId("a trace id in a segment of its own");
+    request.setPing();
+    std::string const bytes = framedMessage(message);
+    for (std::size_t const cut : {4U, 8U, 12U, 15U, 16U}) {
+        RawClient client(orderedPath());
+        client.send(bytes.substr(0, cut));
+        turn();
+        EXPECT_FALSE(client.takeMessage().has_value()) << cut;
+        client.send(bytes.substr(cut));
+        turn();
+        auto const reply = client.takeMessage();
+        ASSERT_TRUE(reply.has_value()) << cut;
+        EXPECT_EQ(parsed(*reply).id, 8U) << cut;
+    }
+}
+
+TEST_F(ConnectionTest, AShortRequestMayFollowTheLongest) {
+    RawClient client(orderedPath());
+    std::string const trace(100000, 't');
+    std::string const request = framed([&trace](auto builder) { builder.setTraceId(trace.c_str()); }, 1);
+    ASSERT_EQ(client.send(request), request.size());
+    turn();
+    client.send(framed(ping, 2));
+    turn();
+    for (uint64_t const id : {1U, 2U}) {
+        auto const message = client.takeMessage();
+        ASSERT_TRUE(message.has_value()) << id;
+        EXPECT_EQ(parsed(*message).id, id);
+    }
+}
+
 TEST_F(ConnectionTest, AnswersThatArePartlyTakenAreSentOn) {
     constexpr uint64_t requests = 5000;
     RawClient client(orderedPath());
@@ -248,15 +284,18 @@ TEST_F(ConnectionTest, fault_23_APeerThatLeavesInMidReplyHurtsNobody) {
 }
 
 TEST_F(ConnectionTest, fault_23_APeerThatLeavesInMidRequestHurtsNobody) {
-    std::string const request = framed(ping);
-    for (std::size_t const cut : {std::size_t{3}, std::size_t{8}, request.size() - 1}) {
-        RawClient leaver(orderedPath());
-        leaver.send(request.substr(0, cut));
-        turn();
-        EXPECT_EQ(server_->connections(), 1U);
-        leaver.close();
-        turn();
-        EXPECT_EQ(server_->connections(), 0U) << cut;
+    std::string const longTrace(5000, 't');
+    for (std::string const &request :
+         {framed(ping), framed([&longTrace](auto builder) { builder.setTraceId(longTrace.c_str()); })}) {
+        for (std::size_t const cut : {std::size_t{3}, std::size_t{8}, request.size() - 1}) {
+            RawClient leaver(orderedPath());
+            leaver.send(request.substr(0, cut));
+            turn();
+            EXPECT_EQ(server_->connections(), 1U);
+            leaver.close();
+            turn();
+            EXPECT_EQ(server_->connections(), 0U) << cut << " of " << request.size();
+        }
     }
     RawClient client(orderedPath());
     EXPECT_EQ(ask(client, framed(ping)).which, Wire::Reply::PONG);
