@@ -36,6 +36,7 @@ public:
     template <typename Record>
     Record *records(std::size_t count) {
         static_assert(std::is_trivially_destructible_v<Record> && std::is_trivially_copyable_v<Record>);
+        // NOLINTNEXTLINE(bugprone-sizeof-expression): a record may be a pointer
         return new (allocate(count * sizeof(Record), alignof(Record))) Record[count]();
     }
 
@@ -43,6 +44,7 @@ public:
     template <typename Record>
     Record *unsetRecords(std::size_t count) {
         static_assert(std::is_trivially_destructible_v<Record> && std::is_trivially_copyable_v<Record>);
+        // NOLINTNEXTLINE(bugprone-sizeof-expression): a record may be a pointer
         return static_cast<Record *>(allocate(count * sizeof(Record), alignof(Record)));
     }
 

@@ -109,7 +109,7 @@ int32_t LumoLib_UnsharedChunksLumo(char const *containerId, char const *uuid, in
                 }
                 block.reset(new (room) LumoUnsharedChunks{answered.getBlockSize(),
                                                           static_cast<std::int64_t>(bitmap.size()) * 8});
-                if (bitmap.size() > 0) {
+                if (!bitmap.empty()) {
                     std::memcpy(block.get() + 1, bitmap.data(), bitmap.size());
                 }
             });
@@ -134,7 +134,7 @@ int32_t LumoLib_GetLumoMetadata(char const *containerId, char const *uuid, LumoM
                 Compact::List<Compact::MetadataPair>::Reader const pairs = reply.getMetadata();
                 connection.requireChunk(pairs.size());
                 for (Compact::MetadataPair::Reader const pair : pairs) {
-                    LumoMetadataEntry *entry = owned->arena.records<LumoMetadataEntry>(1);
+                    auto *entry = owned->arena.records<LumoMetadataEntry>(1);
                     entry->key = owned->arena.copy(pair.getKey());
                     entry->value = owned->arena.copy(pair.getValue());
                     *end = entry;

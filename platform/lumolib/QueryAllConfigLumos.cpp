@@ -19,7 +19,7 @@ struct Head {
 };
 
 LumoQueryResult *lay(std::unique_ptr<Arena> arena, std::vector<LumoQueryEntry> const &entries) {
-    LumoQueryEntry *records = arena->records<LumoQueryEntry>(entries.size());
+    auto *records = arena->records<LumoQueryEntry>(entries.size());
     std::size_t const bytes = sizeof(Head) + entries.size() * sizeof(LumoQueryEntry *);
     auto *head = new (arena->allocate(bytes, alignof(Head))) Head{};
     for (std::size_t place = 0; place < entries.size(); ++place) {

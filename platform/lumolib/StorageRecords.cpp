@@ -36,7 +36,7 @@ void StorageRecords::finish(StorageContainerResult &result) {
 
 void StorageRecords::takeArrays(Compact::List<Compact::StorageArray>::Reader arrays) {
     connection_.requireChunk(arrays.size());
-    StorageArrayInfo *record = arena_.records<StorageArrayInfo>(arrays.size());
+    auto *record = arena_.records<StorageArrayInfo>(arrays.size());
     table_.reserve(table_.size() + arrays.size());
     for (Compact::StorageArray::Reader const array : arrays) {
         fillArray(*record, array);
@@ -62,7 +62,7 @@ void StorageRecords::fillArray(StorageArrayInfo &record, Compact::StorageArray::
     record.modelId = arena_.copy(array.getModelId());
     record.endpointCount = static_cast<std::int32_t>(endpoints.size());
     record.endpoints = arena_.records<ProtocolEndpointInfo *>(endpoints.size());
-    ProtocolEndpointInfo *endpointRecord = arena_.records<ProtocolEndpointInfo>(endpoints.size());
+    auto *endpointRecord = arena_.records<ProtocolEndpointInfo>(endpoints.size());
     for (unsigned place = 0; place < endpoints.size(); ++place) {
         fillEndpoint(endpointRecord[place], endpoints[place]);
         record.endpoints[place] = &endpointRecord[place];
@@ -109,7 +109,7 @@ StorageArrayInfo **StorageRecords::arraysOf(Compact::List<std::uint32_t>::Reader
         repeated = repeated && lastArrays_[place] == table_[places[place]];
     }
     if (!repeated) {
-        StorageArrayInfo **arrays = arena_.records<StorageArrayInfo *>(places.size());
+        auto **arrays = arena_.records<StorageArrayInfo *>(places.size());
         for (unsigned place = 0; place < places.size(); ++place) {
             arrays[place] = table_[places[place]];
         }
