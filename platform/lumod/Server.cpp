@@ -55,7 +55,7 @@ public:
 
     void listen(Wire::UniqueFd socket, bool ordered) {
         listeners_.push_back(std::make_unique<Listener>(io_.unixEventPort, std::move(socket), ordered));
-        accepting_->add(kj::evalLater([this, listener = listeners_.back().get()] { return accept(*listener); }));
+        accepting_->add(acceptAll(*listeners_.back()));
     }
 
     kj::Promise<void> stop() {
@@ -86,6 +86,15 @@ private:
         bool ordered;
     };
 
+    /// Takes connections until the server stops: one that could not be taken, for want of memory, is not the last.
+    kj::Promise<void> acceptAll(Listener &listener) {
+        return kj::evalLater([this, &listener] { return accept(listener); })
+            .catch_([this, &listener](kj::Exception &&exception) {
+                logShortage(exception.getDescription().cStr());
+                return core_.timer.afterDelay(acceptPause).then([this, &listener] { return acceptAll(listener); });
+            });
+    }
+
     kj::Promise<void> accept(Listener &listener) {
         for (int accepted = 0; accepted < acceptsInARow; ++accepted) {
             int const client = ::accept4(listener.socket.get(), nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC);
@@ -95,17 +104,16 @@ private:
             } else if (errno == EAGAIN || errno == EWOULDBLOCK) {
                 return listener.observer.whenBecomesReadable().then([this, &listener] { return accept(listener); });
             } else if (errno != EINTR && errno != ECONNABORTED) {
-                logShortage(errno);
+                logShortage(std::strerror(errno));
                 return core_.timer.afterDelay(acceptPause).then([this, &listener] { return accept(listener); });
             }
         }
         return kj::evalLater([this, &listener] { return accept(listener); });
     }
 
-    void logShortage(int error) {
+    void logShortage(char const *why) {
         if (!std::exchange(isShort_, true)) {
-            core_.log.write(LogLevel::Error, "-",
-                            fmt::format("cannot take a connection: {}; trying again", std::strerror(error)));
+            core_.log.write(LogLevel::Error, "-", fmt::format("cannot take a connection: {}; trying again", why));
         }
     }
 
@@ -122,8 +130,9 @@ private:
         auto connection = kj::heap<Connection>(core_, shutdown_, replyRoom_, io_.unixEventPort, kj::mv(client), ordered,
                                                ++lastNumber_);
         ++count_;
+        auto counted = kj::defer([this] { --count_; });
         auto served = kj::evalLater([connection = connection.get()] { return connection->run(); });
-        connections_.add(served.attach(kj::mv(connection), kj::defer([this] { --count_; })));
+        connections_.add(served.attach(kj::mv(connection), kj::mv(counted)));
     }
 
     std::string refusal(std::optional<Peer> const &peer) const {

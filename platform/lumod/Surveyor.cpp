@@ -6,6 +6,8 @@
 
 #include <fmt/format.h>
 
+#include "JoinAll.h"
+
 namespace Lumod {
 
 using Wire::ErrorCode;
@@ -73,7 +75,7 @@ Answer<Survey> Surveyor::survey(CallPtr const &call) {
             answers.add(asked.size() < 2 ? ask(provider, inquiry, attemptsForAgreement)
                                          : askAmongOthers(provider, inquiry));
         }
-        return kj::joinPromises(answers.finish())
+        return joinAll(answers.finish())
             .then([this, call, asked = std::move(asked)](kj::Array<Outcome<Source>> &&sources) {
                 return Outcome<Survey>(assemble(asked, kj::mv(sources), call));
             });

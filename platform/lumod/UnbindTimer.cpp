@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <utility>
 
+#include "JoinAll.h"
+
 namespace Lumod {
 
 namespace {
@@ -98,7 +100,7 @@ Answer<Done> UnbindTimer::unbindThese(CallPtr const &call, std::vector<std::stri
     for (auto &entry : batches) {
         answers.add(unbindBatch(call, std::make_shared<Batch const>(std::move(entry.second)), 0, std::nullopt));
     }
-    return kj::joinPromises(answers.finish()).then([](kj::Array<Outcome<Done>> &&outcomes) -> Outcome<Done> {
+    return joinAll(answers.finish()).then([](kj::Array<Outcome<Done>> &&outcomes) -> Outcome<Done> {
         for (Outcome<Done> const &outcome : outcomes) {
             if (!outcome.ok()) {
                 return outcome;

@@ -7,6 +7,7 @@
 #include <fmt/format.h>
 
 #include "Endpoints.h"
+#include "JoinAll.h"
 #include "wire/Limits.h"
 
 namespace Lumod {
@@ -100,7 +101,7 @@ Answer<Levels> check(Core &core, CallPtr const &call, Survey survey, std::string
     for (ProviderPtr const &provider : inquiry.providers) {
         answers.add(ProviderCalls(core.services, provider, call).queryVirtualVolumesById(containerId, ids));
     }
-    return kj::joinPromises(answers.finish())
+    return joinAll(answers.finish())
         .then([&core, inquiry = std::move(inquiry), container](kj::Array<Outcome<Presences>> &&outcomes) {
             return Outcome<Levels>(judge(core, inquiry, *container, outcomes));
         });

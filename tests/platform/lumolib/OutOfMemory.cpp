@@ -1,55 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// This program's allocator can be told to fail at the n-th call from now, so that a request can be tried with every
-// allocation of it failing in turn. Its other threads, the daemon's, are never failed.
-#include <cstdlib>
+// A request with every allocation of it failing in turn. The other thread's, the daemon's, never fail.
 #include <filesystem>
 #include <iterator>
-#include <new>
 
+#include "../FailingAllocator.h"
 #include "FakeDaemon.h"
 #include "Host.h"
-
-namespace {
-
-thread_local long failIn = 0;
-
-void *allocateOrFail(std::size_t size) {
-    if (failIn > 0 && --failIn == 0) {
-        throw std::bad_alloc();
-    }
-    void *result = std::malloc(size > 0 ? size : 1);
-    if (result == nullptr) {
-        throw std::bad_alloc();
-    }
-    return result;
-}
-
-} // namespace
-
-void *operator new(std::size_t size) {
-    return allocateOrFail(size);
-}
-
-void *operator new[](std::size_t size) {
-    return allocateOrFail(size);
-}
-
-void operator delete(void *pointer) noexcept {
-    std::free(pointer);
-}
-
-void operator delete[](void *pointer) noexcept {
-    std::free(pointer);
-}
-
-void operator delete(void *pointer, std::size_t) noexcept {
-    std::free(pointer);
-}
-
-void operator delete[](void *pointer, std::size_t) noexcept {
-    std::free(pointer);
-}
 
 namespace LumoTest {
 
@@ -80,11 +37,11 @@ TEST_F(OutOfMemory, fault_62_any_allocation_may_fail) {
     int failures = 0;
     for (long n = 1;; ++n) {
         StorageContainerResult *result = nullptr;
-        failIn = n;
+        FailingAllocator::failIn(n);
         bool const opened = LumoLib_Init(0, 0);
         LumoErrorEx const error = LumoLib_GetStorageContainer(1, nullptr, &result);
-        bool const untouched = failIn > 0;
-        failIn = 0;
+        bool const untouched = FailingAllocator::isPending();
+        FailingAllocator::failIn(0);
         if (!opened) {
             EXPECT_EQ(error.code, code(ErrorCode::NoSession)) << n;
         } else if (!LumoLib_ErrorExIsSuccess(&error)) {
