@@ -20,8 +20,8 @@ WRITING = {"pwrite64", "write", "ftruncate", "fsync", "fdatasync", "unlink", "un
 ASKING = {"openat", "openat2", "newfstatat", "fstat", "pread64", "read", "getdents64", "fcntl", "flock", "connect",
           "recvfrom", "recvmsg", "sendto", "sendmsg"}
 
-# What is called as often as it takes until an answer has come.
-WAITING = {"recvfrom", "recvmsg", "poll"}
+# What is called as often as it takes until an answer has come; how long to wait is set only where there is a wait.
+WAITING = {"recvfrom", "recvmsg", "poll", "setsockopt"}
 
 CALL = re.compile(r"^(?:\d+ +)?(\w+)\((.*)")
 
