@@ -2,6 +2,7 @@
 #include "plexa/MetaObj.h"
 
 #include <algorithm>
+#include <cstring>
 #include <memory>
 #include <new>
 #include <utility>
@@ -16,8 +17,23 @@ MetaStruct::Loose::~Loose() {
     for (std::size_t i = 0; i < count; ++i) {
         destroy(cells[i], columns[i].held);
     }
-    std::destroy_n(columns, count);
-    ::operator delete(columns);
+    drop(columns);
+}
+
+void MetaStruct::Loose::drop(Column *block) {
+    std::destroy_n(block, count);
+    if (block != reinterpret_cast<Column *>(firstColumns)) {
+        ::operator delete(block);
+    }
+}
+
+char *MetaStruct::Loose::roomFor(std::size_t bytes) {
+    if (bytes > firstTextBytes - textBytes) {
+        return nullptr;
+    }
+    char *const room = firstTexts + textBytes;
+    textBytes += bytes;
+    return room;
 }
 
 void MetaStruct::Loose::move(Cell &to, Cell &from, Held held) {
@@ -61,8 +77,7 @@ void MetaStruct::Loose::grow(std::size_t fields) {
     for (std::size_t i = 0; i < count; ++i) {
         move(newCells[i], cells[i], columns[i].held);
     }
-    std::destroy_n(columns, count);
-    ::operator delete(columns);
+    drop(columns);
     columns = newColumns;
     cells = newCells;
     capacity = fields;
@@ -88,7 +103,9 @@ MetaStruct::MetaStruct(MetaStruct const &other)
     : MetaObject(other) {
     auto copy = std::make_unique<Loose>(other.ViewName());
     Fields const fields = other.ViewFields();
-    copy->grow(fields.size());
+    if (fields.size() > copy->capacity) {
+        copy->grow(fields.size());
+    }
     for (; copy->count < fields.size(); ++copy->count) {
         std::size_t const i = copy->count;
         Held const held = fields.columns_[i].held;
@@ -198,7 +215,7 @@ boost::shared_ptr<MetaObject> MetaStruct::GetField(std::string const &field) con
     Held &held = loose.columns[place].held;
     boost::shared_ptr<MetaObject> made;
     if (held == Held::Text) {
-        made = boost::make_shared<MetaString>(std::move(cell.text));
+        made = boost::make_shared<MetaString>(cell.text); // whose text may lie in here
     } else if (held == Held::Number) {
         made = boost::make_shared<MetaInt>(cell.number);
     } else {
@@ -256,7 +273,7 @@ MetaStruct::Cell &MetaStruct::Emptied(std::string const &field, Held next) {
         return loose.cells[place];
     }
     if (loose.count == loose.capacity) {
-        loose.grow(loose.count == 0 ? 2 : 2 * loose.count);
+        loose.grow(2 * loose.count);
     }
     new (loose.columns + place) Column{field, next};
     ++loose.count;
@@ -265,7 +282,15 @@ MetaStruct::Cell &MetaStruct::Emptied(std::string const &field, Held next) {
 
 void MetaStruct::StoreText(std::string const &field, std::string_view value) {
     MetaString text;
-    text.Assign(value); // before the old one goes, of which it may be a part
+    char *const room = loose_ != nullptr ? loose_->roomFor(value.size()) : nullptr;
+    if (room != nullptr) {
+        std::memcpy(room, value.data(), value.size());
+        text.text_ = room;
+        text.size_ = static_cast<uint32_t>(value.size());
+        text.set_ = true;
+    } else {
+        text.Assign(value); // before the old one goes, of which it may be a part
+    }
     new (&Emptied(field, Held::Text).text) MetaString(std::move(text));
 }
 

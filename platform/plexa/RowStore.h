@@ -4,6 +4,7 @@
 #include <atomic>
 #include <cstddef>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <boost/shared_ptr.hpp>
@@ -12,10 +13,13 @@
 
 namespace Plexa::MetaObj {
 
-/// A structure on its own: its fields, in room that grows.
+/// A structure on its own. Two fields with short texts, and the structure that a command is about to append to a list
+/// has hardly more, need nothing beside it; more of them lie in room that grows.
 struct MetaStruct::Loose {
     explicit Loose(std::string const &structureName)
-        : name(structureName) {}
+        : name(structureName)
+        , columns(reinterpret_cast<Column *>(firstColumns))
+        , cells(reinterpret_cast<Cell *>(firstCells)) {}
     ~Loose();
     Loose(Loose const &) = delete;
     Loose &operator=(Loose const &) = delete;
@@ -28,12 +32,23 @@ struct MetaStruct::Loose {
     std::size_t find(std::string const &field) const;
     /// Room for so many fields.
     void grow(std::size_t fields);
+    /// Lets go of a block of columns and cells, if it is one.
+    void drop(Column *block);
+    /// Room for a text among the first ones; null when there is no more.
+    char *roomFor(std::size_t bytes);
+
+    static constexpr std::size_t firstCapacity = 2;
+    static constexpr std::size_t firstTextBytes = 64;
 
     std::string name;
     std::size_t count = 0;
-    std::size_t capacity = 0;
-    Column *columns = nullptr;
-    Cell *cells = nullptr; // in the same block, behind the columns
+    std::size_t capacity = firstCapacity;
+    Column *columns;
+    Cell *cells; // in one block with the columns, behind them, or both in the first ones
+    std::size_t textBytes = 0;
+    alignas(Column) std::byte firstColumns[firstCapacity * sizeof(Column)];
+    alignas(Cell) std::byte firstCells[firstCapacity * sizeof(Cell)];
+    char firstTexts[firstTextBytes];
 };
 
 /// Where the values of a list's structures lie. A long list holds rows that were all made alike, so their names are

@@ -113,7 +113,7 @@ private:
             auto const &structure = as<MetaStruct>(row.get());
             for (std::size_t i = 0; i < columns.size(); ++i) {
                 comma(i);
-                cell(findValue(structure, columns[i]), columns[i].schema.get());
+                cell(findValue(structure, columns[i]), columns[i].schema);
             }
             out_.append(lineEnd);
         }

@@ -87,11 +87,12 @@ private:
         FieldPlan const *const around = field_;
         enter();
         writer_.beginStruct(structure, plan->size());
+        MetaObj::MetaStruct::Fields const fields = structure.ViewFields();
         for (std::size_t i = 0; i < plan->size(); ++i) {
             FieldPlan const &field = (*plan)[i];
             writer_.field(field, i);
             field_ = &field;
-            value(valueOf(structure, field), field.schema.get(), false);
+            value(valueOf(fields, field), field.schema, false);
         }
         field_ = around;
         --depth_;

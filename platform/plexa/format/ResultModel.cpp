@@ -214,10 +214,11 @@ StructurePlan StructurePlans::made(MetaStruct const &structure, MetaObject const
     StructurePlan plan;
     std::map<std::string, std::size_t> places; // of the plan's fields
     if (isDeclared) {
-        auto const &declared = as<MetaStruct>(schema);
-        for (std::string const &field : declared.GetFieldNames()) {
+        MetaStruct::Fields const declared = as<MetaStruct>(schema).ViewFields();
+        for (std::size_t i = 0; i < declared.size(); ++i) {
+            std::string const &field = declared.name(i);
             places.emplace(field, plan.size());
-            plan.push_back({field, declared.GetField(field), settings_.unit(name, field), label_(field)});
+            plan.push_back({field, declared.value(i), settings_.unit(name, field), label_(field)});
         }
     }
     MetaStruct::Fields const fields = structure.ViewFields();
@@ -225,7 +226,7 @@ StructurePlan StructurePlans::made(MetaStruct const &structure, MetaObject const
         std::string const &field = fields.name(i);
         auto const [place, isNew] = places.emplace(field, plan.size());
         if (isNew) {
-            plan.push_back({field, Object(), settings_.unit(name, field), label_(field)});
+            plan.push_back({field, nullptr, settings_.unit(name, field), label_(field)});
         }
         plan[place->second].index = i;
     }

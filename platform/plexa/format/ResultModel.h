@@ -87,12 +87,12 @@ constexpr char const *isOfUnknownKind = "is of a kind that it does not know";
 /// @throws FormatError
 [[noreturn]] void refuse(std::string const &format, std::string const *field, char const *why);
 
-/// A field of a structure and what it is declared as; the schema may be empty.
+/// A field of a structure and what it is declared as: part of a schema that outlives the plan, or null.
 struct FieldPlan {
     static constexpr std::size_t nowhere = static_cast<std::size_t>(-1);
 
     std::string name;
-    Object schema;
+    MetaObj::MetaObject const *schema = nullptr;
     std::string unit;
     std::string label;           ///< the name as the format writes it
     std::size_t index = nowhere; ///< its place in the structure that the plan was made for
@@ -103,8 +103,12 @@ struct FieldPlan {
 using StructurePlan = std::vector<FieldPlan>;
 
 /// The value of a planned field; null when the structure has none.
+inline MetaObj::MetaObject const *valueOf(MetaObj::MetaStruct::Fields const &fields, FieldPlan const &field) {
+    return field.index == FieldPlan::nowhere ? nullptr : fields.value(field.index);
+}
+
 inline MetaObj::MetaObject const *valueOf(MetaObj::MetaStruct const &structure, FieldPlan const &field) {
-    return field.index == FieldPlan::nowhere ? nullptr : structure.ViewFields().value(field.index);
+    return valueOf(structure.ViewFields(), field);
 }
 
 /// The value of a field; null when there is none of that name.

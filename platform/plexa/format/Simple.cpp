@@ -85,7 +85,7 @@ private:
         out_.print(paint_.label, field.label, ":", paint_.end);
         if (type == ValueType::List || type == ValueType::Struct) {
             out_.put('\n');
-            this->value(value, field.schema.get(), indent + step);
+            this->value(value, field.schema, indent + step);
         } else {
             out_.put(' ');
             scalar(value);

@@ -58,9 +58,12 @@ private:
     std::size_t size_;
 };
 
-bool isCollection(MetaObject const *value) {
-    ValueType const type = typeOf(value);
+bool isCollection(ValueType type) {
     return type == ValueType::List || type == ValueType::Struct;
+}
+
+bool isCollection(MetaObject const *value) {
+    return isCollection(typeOf(value));
 }
 
 /// True for what cannot stand in a cell: structures, and lists that hold more than single values.
@@ -72,14 +75,10 @@ bool needsRoomOfItsOwn(MetaObject const *value) {
     return std::any_of(elements.begin(), elements.end(), [](Object const &each) { return isCollection(each.get()); });
 }
 
-Shown shown(MetaObject const *value, std::string const &unit, std::string &room) {
-    ValueType const type = typeOf(value);
+/// Of anything but a text that can be shown as it is.
+Shown shownElsewise(MetaObject const *value, ValueType type, std::string const &unit, std::string &room) {
     if (type == ValueType::Unset) {
         return {};
-    }
-    if (type == ValueType::Text && unit.empty() && isPlainAscii(as<MetaString>(value).ViewValue())) {
-        std::string_view const text = as<MetaString>(value).ViewValue();
-        return {text, text.size()};
     }
     if (type == ValueType::Boolean && unit.empty()) {
         std::string_view const text = as<MetaBool>(value).GetValue() ? "true" : "false";
@@ -97,6 +96,21 @@ Shown shown(MetaObject const *value, std::string const &unit, std::string &room)
         room += escaped(unit);
     }
     return {room, displayWidth(room)};
+}
+
+/// @param type the value's
+inline Shown shown(MetaObject const *value, ValueType type, std::string const &unit, std::string &room) {
+    if (type == ValueType::Text && unit.empty()) {
+        std::string_view const text = as<MetaString>(value).ViewValue();
+        if (isPlainAscii(text)) {
+            return {text, text.size()};
+        }
+    }
+    return shownElsewise(value, type, unit, room);
+}
+
+Shown shown(MetaObject const *value, std::string const &unit, std::string &room) {
+    return shown(value, typeOf(value), unit, room);
 }
 
 class TableWriter {
@@ -203,23 +217,26 @@ private:
                 first = first == nullptr ? plan : first;
                 last = plan;
             }
+            MetaStruct::Fields const fields = structure.ViewFields();
             for (Column &column : layout.columns) {
                 MetaObject const *const value =
-                    plan == first ? valueOf(structure, column.field) : findValue(structure, column.field);
-                requireShape(value, column.field);
-                column.width = std::max(column.width, widthOf(value, column.field.unit));
+                    plan == first ? valueOf(fields, column.field) : findValue(structure, column.field);
+                ValueType const type = typeOf(value);
+                requireShape(value, type, column.field);
+                column.width = std::max(column.width, widthOf(value, type, column.field.unit));
             }
             for (FieldPlan const &field : layout.apart) {
-                requireShape(findValue(structure, field), field);
+                MetaObject const *const value = findValue(structure, field);
+                requireShape(value, typeOf(value), field);
             }
         }
         return true;
     }
 
-    static void requireShape(MetaObject const *value, FieldPlan const &field) {
-        if (isCollection(value)) {
+    static void requireShape(MetaObject const *value, ValueType type, FieldPlan const &field) {
+        if (isCollection(type)) {
             checkShape(value, format, &field.name);
-        } else if (typeOf(value) == ValueType::Unknown) {
+        } else if (type == ValueType::Unknown) {
             refuse(format, &field.name, isOfUnknownKind);
         }
     }
@@ -229,7 +246,7 @@ private:
         merge(layout.fields, plan);
         for (std::size_t i = before; i < layout.fields.size(); ++i) {
             FieldPlan const &field = layout.fields[i];
-            Kind const kind = kindOf(nullptr, field.schema.get());
+            Kind const kind = kindOf(nullptr, field.schema);
             if (kind == Kind::StructList || kind == Kind::Struct) {
                 layout.apart.push_back(field);
             } else {
@@ -238,9 +255,9 @@ private:
         }
     }
 
-    std::size_t widthOf(MetaObject const *value, std::string const &unit) {
-        if (!isCollection(value)) {
-            return shown(value, unit, room_).width;
+    std::size_t widthOf(MetaObject const *value, ValueType type, std::string const &unit) {
+        if (!isCollection(type)) {
+            return shown(value, type, unit, room_).width;
         }
         std::size_t width = 0;
         if (!needsRoomOfItsOwn(value)) {
@@ -271,13 +288,15 @@ private:
         }
         bool isFlat = true;
         bool isTall = false;
+        MetaStruct::Fields const fields = row.ViewFields();
         for (std::size_t i = 0; i < columns.size(); ++i) {
             MetaObject const *const value =
-                layout.isUniform ? valueOf(row, columns[i].field) : findValue(row, columns[i].field);
-            if (isCollection(value)) {
+                layout.isUniform ? valueOf(fields, columns[i].field) : findValue(row, columns[i].field);
+            ValueType const type = typeOf(value);
+            if (isCollection(type)) {
                 isFlat = false;
             } else {
-                cells_[i] = shown(value, columns[i].field.unit, rooms_[i]);
+                cells_[i] = shown(value, type, columns[i].field.unit, rooms_[i]);
                 isTall = isTall || cells_[i].width > columns[i].width;
             }
         }
@@ -287,7 +306,15 @@ private:
         }
         std::size_t owed = indent; // blanks due before the next text, so that no line ends in any
         for (std::size_t i = 0; i < columns.size(); ++i) {
-            put(cells_[i].text, cells_[i].width, columns[i], {}, owed);
+            Shown const &cell = cells_[i];
+            std::size_t const padding = columns[i].width - cell.width;
+            owed += columns[i].isNumber ? padding : 0;
+            if (!cell.text.empty()) {
+                out_.fill(owed, ' ');
+                out_.append(cell.text);
+                owed = 0;
+            }
+            owed += (columns[i].isNumber ? 0 : padding) + columnGap;
         }
         out_.put('\n');
         return true;
@@ -357,7 +384,7 @@ private:
         std::string const header = settings_.header(row);
         out_.fill(indent, ' ');
         out_.print(paint_.label, field.label, header.empty() ? "" : " of ", escaped(header), ":", paint_.end, "\n");
-        this->value(value, field.schema.get(), false, indent + step);
+        this->value(value, field.schema, false, indent + step);
     }
 
     FormatSettings const &settings_;

@@ -67,6 +67,12 @@ public:
     }
 
     void fill(std::size_t count, char c) {
+        constexpr std::size_t few = 16;
+        if (count <= few && few <= room - size_) { // of which what is too much is written over
+            std::memset(buffer_.data() + size_, c, few);
+            size_ += count;
+            return;
+        }
         while (count > 0) {
             if (size_ == room) {
                 flush();

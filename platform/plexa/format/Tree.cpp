@@ -78,10 +78,10 @@ private:
         out_.print(paint_.label, field.label);
         if (type == ValueType::List) {
             out_.print(paint_.end, "\n");
-            children(as<MetaList>(value), field.schema.get());
+            children(as<MetaList>(value), field.schema);
         } else if (type == ValueType::Struct) {
             out_.print(paint_.end, "\n");
-            children(as<MetaStruct>(value), field.schema.get());
+            children(as<MetaStruct>(value), field.schema);
         } else {
             out_.print(":", paint_.end, " ", escaped(scalarText(value)));
             out_.print(field.unit.empty() ? "" : " ", escaped(field.unit), "\n");

@@ -13,6 +13,22 @@ struct EscapeCase {
     std::string shown;
 };
 
+TEST(Text, EveryByteAtEveryPlaceIsPlainOrNot) {
+    for (std::size_t size = 0; size <= 25; ++size) {
+        std::string text(size, ' ');
+        EXPECT_TRUE(Plexa::isPlainAscii(text));
+        for (char &place : text) {
+            for (int code = 0; code < 256; ++code) {
+                place = static_cast<char>(code);
+                bool const printing = code >= ' ' && code < 0x7F;
+                ASSERT_EQ(Plexa::isPlainAscii(text), printing) << code << " of " << size;
+                ASSERT_EQ((Plexa::isPlainAsciiBut<'"', '\\'>(text)), printing && code != '"' && code != '\\') << code;
+            }
+            place = '~';
+        }
+    }
+}
+
 TEST(Text, EscapesWhatActsOrHides) {
     EscapeCase const cases[] = {
         {"plain \\ text", "plain \\ text"},  {"\n\r\t", "\\n\\r\\t"}, {"\x1b[31m", "\\x1b[31m"},
