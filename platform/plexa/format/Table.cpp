@@ -36,28 +36,6 @@ struct Layout {
     bool isUniform = true;       ///< every row holds the same fields in the same places
 };
 
-/// The structures of a list, or one alone.
-class Rows {
-public:
-    explicit Rows(std::vector<Object> const &elements)
-        : elements_(elements.data())
-        , size_(elements.size()) {}
-    explicit Rows(MetaStruct const &one)
-        : one_(&one)
-        , size_(1) {}
-    std::size_t size() const {
-        return size_;
-    }
-    MetaObject const *operator[](std::size_t place) const {
-        return elements_ != nullptr ? elements_[place].get() : one_;
-    }
-
-private:
-    Object const *elements_ = nullptr;
-    MetaObject const *one_ = nullptr;
-    std::size_t size_;
-};
-
 bool isCollection(ValueType type) {
     return type == ValueType::List || type == ValueType::Struct;
 }

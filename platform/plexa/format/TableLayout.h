@@ -27,4 +27,26 @@ void fitColumns(std::vector<Column> &columns, std::size_t room);
 /// A text in lines of at most width columns: broken at blanks, a longer word anywhere. Expects what escaped() returned.
 std::vector<std::string> brokenToWidth(std::string_view text, std::size_t width);
 
+/// The structures of a list, or one alone.
+class Rows {
+public:
+    explicit Rows(std::vector<Object> const &elements)
+        : elements_(elements.data())
+        , size_(elements.size()) {}
+    explicit Rows(MetaObj::MetaStruct const &one)
+        : one_(&one)
+        , size_(1) {}
+    std::size_t size() const {
+        return size_;
+    }
+    MetaObj::MetaObject const *operator[](std::size_t place) const {
+        return elements_ != nullptr ? elements_[place].get() : one_;
+    }
+
+private:
+    Object const *elements_ = nullptr;
+    MetaObj::MetaObject const *one_ = nullptr;
+    std::size_t size_;
+};
+
 } // namespace Plexa
