@@ -16,13 +16,13 @@
 #include <sys/resource.h>
 #include <vector>
 
-#include "RawSession.h"
+#include "PreparedSession.h"
 
 namespace {
 
 /// Connects and asks once. @return the daemon's process
-std::unique_ptr<Bench::RawSession> visitor(std::string const &socket, unsigned &daemon) {
-    auto session = std::make_unique<Bench::RawSession>(socket);
+std::unique_ptr<Bench::PreparedSession> visitor(std::string const &socket, unsigned &daemon) {
+    auto session = std::make_unique<Bench::PreparedSession>(socket);
     session->prepare([](Wire::Request::Builder request) { request.setPing(); },
                      [&daemon](Wire::Reply::Reader reply) { daemon = reply.getPong().getPid(); });
     return session;
@@ -50,7 +50,7 @@ void run(std::string const &socket, std::vector<size_t> const &counts) {
         visitor(socket, daemon);
     }
     long long const before = residentBytes(daemon);
-    std::vector<std::unique_ptr<Bench::RawSession>> idle;
+    std::vector<std::unique_ptr<Bench::PreparedSession>> idle;
     for (size_t const count : counts) {
         while (idle.size() < count) {
             idle.push_back(visitor(socket, daemon));

@@ -5,7 +5,7 @@
 //
 //   bench_mounted RECORDING DATABASE
 //
-// The recording is one of bench_replay's, for the daemon of TOVI_ROOT; the database is a copy of the host store.
+// The recording is one of bench_record's, for the daemon of TOVI_ROOT; the database is a copy of the host store.
 #include <cstdio>
 #include <cstdlib>
 #include <stdexcept>

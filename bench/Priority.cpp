@@ -19,20 +19,20 @@
 #include <string>
 #include <vector>
 
-#include "RawSession.h"
+#include "PreparedSession.h"
 
 namespace {
 
 constexpr size_t waitingChanges = 100;
 
-using Bench::RawSession;
+using Bench::PreparedSession;
 
 struct Amount {
     size_t rounds;
     size_t requests;
 };
 
-void printRound(char const *queue, char const *name, RawSession &session, RawSession::Fill const &fill,
+void printRound(char const *queue, char const *name, PreparedSession &session, PreparedSession::Fill const &fill,
                 size_t requests) {
     session.prepare(fill);
     std::vector<long long> taken;
@@ -45,8 +45,8 @@ void printRound(char const *queue, char const *name, RawSession &session, RawSes
     std::printf("%s %s %lld %lld %lld\n", queue, name, taken[requests / 2], taken[requests * 99 / 100], taken.back());
 }
 
-void printRounds(char const *queue, std::string const &root, RawSession::Fill const &bind, Amount amount) {
-    RawSession session(root + "/run/lumod-priority.sock");
+void printRounds(char const *queue, std::string const &root, PreparedSession::Fill const &bind, Amount amount) {
+    PreparedSession session(root + "/run/lumod-priority.sock");
     for (size_t round = 0; round < amount.rounds; ++round) {
         printRound(
             queue, "ping", session, [](auto request) { request.setPing(); }, amount.requests);
@@ -64,9 +64,9 @@ void run(std::string const &root, std::string const &container, std::string cons
     };
     printRounds("free", root, bind, amount);
 
-    std::vector<std::unique_ptr<RawSession>> stuck;
+    std::vector<std::unique_ptr<PreparedSession>> stuck;
     for (size_t i = 0; i <= waitingChanges; ++i) {
-        stuck.push_back(std::make_unique<RawSession>(root + "/run/lumod.sock"));
+        stuck.push_back(std::make_unique<PreparedSession>(root + "/run/lumod.sock"));
         if (i == 0) {
             stuck.back()->begin([&](Wire::Request::Builder request) {
                 auto create = request.initCreateVirtualVolume();
@@ -74,7 +74,9 @@ void run(std::string const &root, std::string const &container, std::string cons
                 create.setDirectoryName("stuck");
             });
             // The daemon has read it before it answers a ping that came later.
-            RawSession(root + "/run/lumod.sock").prepare([](Wire::Request::Builder request) { request.setPing(); });
+            PreparedSession(root + "/run/lumod.sock").prepare([](Wire::Request::Builder request) {
+                request.setPing();
+            });
         } else {
             stuck.back()->begin(bind);
         }

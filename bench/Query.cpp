@@ -19,7 +19,7 @@
 #include <stdexcept>
 #include <string>
 
-#include "RawSession.h"
+#include "PreparedSession.h"
 #include "lumolib/LumoLib.h"
 
 namespace {
@@ -41,7 +41,7 @@ long long nanosecondsOf(Work const &work) {
 }
 
 void printTimes(std::string const &root, int rounds) {
-    Bench::RawSession raw(root + "/run/lumod.sock");
+    Bench::PreparedSession raw(root + "/run/lumod.sock");
     raw.prepare([](Wire::Request::Builder request) { request.setGetStorageContainer(); });
     LumoLib_FreeStorageContainerResult(query()); // a warm-up, like the raw side's first round
     for (int round = 0; round < rounds; ++round) {

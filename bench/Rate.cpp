@@ -26,7 +26,7 @@
 
 #include "Crowd.h"
 #include "EchoServer.h"
-#include "RawSession.h"
+#include "PreparedSession.h"
 
 namespace {
 
@@ -60,7 +60,7 @@ struct Amount {
 Work daemonWork(std::string const &what) {
     char const *const root = std::getenv("TOVI_ROOT");
     std::string const run = std::string(root == nullptr ? "" : root) + "/run/";
-    Bench::RawSession session(run + "lumod.sock");
+    Bench::PreparedSession session(run + "lumod.sock");
     Work work;
     if (what == "ping") {
         work.answerBytes = session.prepare([](Wire::Request::Builder request) { request.setPing(); });

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "RawSession.h"
 
-#include <capnp/serialize.h>
 #include <cerrno>
 #include <cstring>
 #include <poll.h>
@@ -26,19 +25,6 @@ void receive(int fd, void *into, size_t size) {
     }
 }
 
-std::vector<std::byte> serialize(RawSession::Fill const &fill) {
-    capnp::MallocMessageBuilder message;
-    auto request = message.initRoot<Wire::Request>();
-    request.setVersion(Wire::PROTOCOL_VERSION);
-    request.setId(1);
-    request.setDeadlineMs(60000);
-    fill(request);
-    auto const words = capnp::messageToFlatArray(message);
-    auto const bytes = words.asBytes();
-    auto const *data = reinterpret_cast<std::byte const *>(bytes.begin());
-    return {data, data + bytes.size()};
-}
-
 } // namespace
 
 RawSession::RawSession(std::string const &socketPath)
@@ -61,31 +47,6 @@ RawSession::~RawSession() {
     close(fd_);
 }
 
-size_t RawSession::prepare(Fill const &fill, Look const &look) {
-    request_ = serialize(fill);
-    size_t total = 0;
-    send();
-    replyCount_ = 0;
-    for (bool last = false; !last; ++replyCount_) {
-        size_t const size = readMessage();
-        total += size;
-        auto const flat =
-            kj::arrayPtr(reinterpret_cast<capnp::word const *>(buffer_.data()), size / sizeof(capnp::word));
-        capnp::ReaderOptions options;
-        options.traversalLimitInWords = UINT64_MAX;
-        capnp::FlatArrayMessageReader reader(flat, options);
-        auto const reply = reader.getRoot<Wire::Reply>();
-        if (reply.isFailure()) {
-            throw std::runtime_error(std::string("the daemon refused: ") + reply.getFailure().getSentence().cStr());
-        }
-        if (look) {
-            look(reply);
-        }
-        last = reply.getLast();
-    }
-    return total;
-}
-
 void RawSession::prepare(std::vector<std::byte> request, size_t replyCount) {
     request_ = std::move(request);
     replyCount_ = replyCount;
@@ -100,12 +61,6 @@ size_t RawSession::ask() {
     return total;
 }
 
-void RawSession::begin(Fill const &fill) {
-    request_ = serialize(fill);
-    replyCount_ = 0;
-    send();
-}
-
 bool RawSession::isAnswered() const {
     pollfd waited{fd_, POLLIN, 0};
     return poll(&waited, 1, 0) > 0;
@@ -117,7 +72,6 @@ void RawSession::send() {
     }
 }
 
-/// Reads one message, segment table and all, to the buffer's beginning. @return its bytes.
 size_t RawSession::readMessage() {
     uint32_t head[2];
     receive(fd_, head, sizeof(head));

@@ -1,19 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <capnp/message.h>
 #include <cstddef>
 #include <cstdint>
-#include <functional>
 #include <string>
 #include <vector>
-
-#include "wire/lumod.capnp.h"
 
 namespace Bench {
 
 /// The floor of every question to the daemon: a socket, one request that was serialized beforehand, and the bytes of
-/// the replies read into one buffer that nobody looks into. Throws std::runtime_error for whatever goes wrong.
+/// the replies read into one buffer that nobody looks into. Floors start from scratch in every round, so this knows
+/// bytes only and stands on no library but the C one. Throws std::runtime_error for whatever goes wrong.
 class RawSession {
 public:
     explicit RawSession(std::string const &socketPath);
@@ -21,18 +18,10 @@ public:
     RawSession(RawSession const &) = delete;
     RawSession &operator=(RawSession const &) = delete;
 
-    using Fill = std::function<void(Wire::Request::Builder)>;
-    using Look = std::function<void(Wire::Reply::Reader)>;
-
-    /// What ask() sends from now on. Asks once, reading the replies with care, to learn how many there are.
-    /// @return the bytes read
-    size_t prepare(Fill const &fill, Look const &look = {});
-    /// The same with a request that was serialized before, and the number of its replies.
+    /// What ask() sends from now on, and how many messages answer it.
     void prepare(std::vector<std::byte> request, size_t replyCount);
-    /// Sends the request and reads as many reply messages as the first time. @return the bytes read.
+    /// Sends the request and reads its replies. @return the bytes read.
     size_t ask();
-    /// Sends another request and waits for nothing.
-    void begin(Fill const &fill);
     /// Whether something came, or the connection ended, since.
     bool isAnswered() const;
     size_t replyCount() const {
@@ -42,10 +31,15 @@ public:
         return request_;
     }
 
-private:
+protected:
     void send();
+    /// Reads one message, segment table and all, to the beginning of buffer(). @return its bytes.
     size_t readMessage();
+    std::vector<std::byte> const &buffer() const {
+        return buffer_;
+    }
 
+private:
     int fd_;
     std::vector<std::byte> request_;
     std::vector<std::byte> buffer_;

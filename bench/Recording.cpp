@@ -1,38 +1,30 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Recording.h"
 
-#include <fstream>
+#include <cstdio>
+#include <memory>
 #include <stdexcept>
 #include <utility>
+#include <vector>
 
 #include "RawSession.h"
 
 namespace Bench {
 
-void writeRecording(std::string const &path, std::vector<Exchange> const &exchanges) {
-    std::ofstream file(path, std::ios::binary);
-    for (Exchange const &exchange : exchanges) {
-        size_t const head[2] = {exchange.request.size(), exchange.replyCount};
-        file.write(reinterpret_cast<char const *>(head), sizeof(head));
-        file.write(reinterpret_cast<char const *>(exchange.request.data()),
-                   static_cast<std::streamsize>(exchange.request.size()));
-    }
-    if (!file.flush()) {
-        throw std::runtime_error(path + " cannot be written");
-    }
-}
-
 size_t replayRecording(std::string const &socketPath, std::string const &path) {
     RawSession session(socketPath);
-    std::ifstream file(path, std::ios::binary);
+    std::unique_ptr<FILE, int (*)(FILE *)> const file(std::fopen(path.c_str(), "rbe"), std::fclose);
+    if (!file) {
+        throw std::runtime_error(path + " cannot be read");
+    }
     size_t bytes = 0;
-    size_t head[2];
-    while (file.read(reinterpret_cast<char *>(head), sizeof(head))) {
-        std::vector<std::byte> request(head[0]);
-        if (!file.read(reinterpret_cast<char *>(request.data()), static_cast<std::streamsize>(request.size()))) {
+    RecordedHead head{};
+    while (std::fread(&head, sizeof(head), 1, file.get()) == 1) {
+        std::vector<std::byte> request(head.requestBytes);
+        if (std::fread(request.data(), request.size(), 1, file.get()) != 1) {
             throw std::runtime_error(path + " ends early");
         }
-        session.prepare(std::move(request), head[1]);
+        session.prepare(std::move(request), head.replyCount);
         bytes += session.ask();
     }
     if (bytes == 0) {

@@ -3,21 +3,18 @@
 
 #include <cstddef>
 #include <string>
-#include <vector>
 
 namespace Bench {
 
-/// A request, serialized, and how many replies it has.
-struct Exchange {
-    std::vector<std::byte> request;
-    size_t replyCount = 0;
+/// What stands before each request of a recording, in the machine's own byte order: its bytes, and how many replies it
+/// has. bench_record writes recordings.
+struct RecordedHead {
+    size_t requestBytes;
+    size_t replyCount;
 };
 
-/// Both throw std::runtime_error for whatever goes wrong.
-void writeRecording(std::string const &path, std::vector<Exchange> const &exchanges);
-
 /// Sends the requests of a recording to the daemon behind the socket and reads their replies, one after the other.
-/// @return the bytes read
+/// Throws std::runtime_error for whatever goes wrong. @return the bytes read
 size_t replayRecording(std::string const &socketPath, std::string const &path);
 
 } // namespace Bench

@@ -3,10 +3,11 @@
 // The floor of every command that changes the host: a bare program that opens a database file as the host store is
 // opened and commits as many durable transactions, one row each.
 //
-//   bench_transactions FILE COUNT STATEMENT [SOCKET]
+//   bench_transactions FILE COUNT STATEMENT [RECORDING SOCKET]
 //
-// STATEMENT is an INSERT whose ?1 is bound to "bench-<n>" and ?2 to a container id made of n. With a SOCKET the program
-// also asks the daemon behind it whether it is there, once: the round trip of a command that needs the daemon.
+// STATEMENT is an INSERT whose ?1 is bound to "bench-<n>" and ?2 to a container id made of n. With a RECORDING of
+// bench_record's the program also sends its requests to the daemon behind the SOCKET: the round trip of a command that
+// needs the daemon.
 #include <cstdio>
 #include <cstdlib>
 #include <stdexcept>
@@ -14,7 +15,7 @@
 
 #include <sqlite3.h>
 
-#include "RawSession.h"
+#include "Recording.h"
 
 namespace {
 
@@ -50,15 +51,15 @@ void commitEach(sqlite3 *database, int count, char const *insert) {
 } // namespace
 
 int main(int argc, char **argv) {
-    int const count = argc == 4 || argc == 5 ? std::atoi(argv[2]) : 0;
+    int const count = argc == 4 || argc == 6 ? std::atoi(argv[2]) : 0;
     if (count < 1) {
-        std::fputs("usage: bench_transactions FILE COUNT STATEMENT [SOCKET]\n", stderr);
+        std::fputs("usage: bench_transactions FILE COUNT STATEMENT [RECORDING SOCKET]\n", stderr);
         return 2;
     }
     sqlite3 *database = nullptr;
     try {
-        if (argc == 5) {
-            Bench::RawSession(argv[4]).prepare([](Wire::Request::Builder request) { request.setPing(); });
+        if (argc == 6) {
+            Bench::replayRecording(argv[5], argv[4]);
         }
         check(database, sqlite3_open_v2(argv[1], &database, SQLITE_OPEN_READWRITE, nullptr));
         execute(database, "PRAGMA journal_mode=DELETE; PRAGMA synchronous=EXTRA; PRAGMA foreign_keys=ON");

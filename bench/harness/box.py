@@ -60,6 +60,10 @@ class Host:
     def register(self, url=None, name="bench"):
         self.lumo("orkaprovider", "add", "--vp-name", name, "--vp-url", url or self.url)
 
+    def record(self, path, *words):
+        """Writes down in a file, for floors to send, what is asked of this host's daemon."""
+        subprocess.run([self.build.program("bench_record"), path, *words], env=self.env, check=True)
+
     def trust(self, url, certificate):
         """The host takes this certificate for the provider at the URL."""
         authority = url.removeprefix("https://").split("/")[0]

@@ -4,7 +4,6 @@ import contextlib
 import os
 import pathlib
 import shutil
-import subprocess
 import time
 
 from harness.box import SUBTREE, Host, durable_copy, rounds_of, timed
@@ -61,7 +60,7 @@ def load(suite):
             host.register()
             host.lumo("storagecontainer", "load")
             recording, copy = (os.path.join(host.root, name) for name in ("requests", "copy.db"))
-            subprocess.run([suite.build.program("bench_replay"), "record", recording, "containers"], env=host.env, check=True)
+            host.record(recording, "containers")
             shutil.copy(os.path.join(host.root, "host.db"), copy)
             commands[size] = [suite.build.program("bench_mounted"), recording, copy], host.env
 
@@ -121,13 +120,14 @@ def _write_config_volume(suite, host, container):
     for command in ("add", "mount", "umount"):
         host.lumo("configlumo", command, *volume)
     template = os.path.join(host.root, "host.db")
-    socket = os.path.join(host.root, "run", "lumod.sock")
+    ping, socket = os.path.join(host.root, "ping"), os.path.join(host.root, "run", "lumod.sock")
+    host.record(ping, "ping")
     insert = "INSERT INTO endpoint_outage (uid) VALUES (?1)"
     pairs = {"mount": [], "umount": []}
     for _ in range(suite.options.rounds or 60):
         for command, taken in pairs.items():
             ours = timed(["tovicli", *SUBTREE, "configlumo", command, *volume], host.env)
             bare = durable_copy(template, os.path.join(host.root, "bare.db"))
-            taken.append((ours, timed([suite.build.program("bench_transactions"), bare, "1", insert, socket], host.env)))
+            taken.append((ours, timed([suite.build.program("bench_transactions"), bare, "1", insert, ping, socket], host.env)))
     for command, taken in pairs.items():
         suite.report.pairs(f"write configlumo {command}", taken, 1.4, 1.4)

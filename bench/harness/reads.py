@@ -2,7 +2,6 @@
 """Long answers: through the client library, through commands, through formats."""
 import contextlib
 import os
-import subprocess
 
 from harness.box import SUBTREE, Host, rounds_of
 
@@ -71,9 +70,8 @@ def _commands(suite, host, words, record):
     facts = {"container": loaded["StorageContainer Id"], "path": os.path.join(host.root, "volumes", loaded["StorageContainer Name"])}
     facts["volume"] = host.lumo_json("storagecontainer", "checklumos", "-p", facts["path"])[0]["LumoId"]
     requests = os.path.join(host.root, "requests")
-    replay = suite.build.program("bench_replay")
-    subprocess.run([replay, "record", requests, *(word.format(**facts) for word in record)], env=host.env, check=True)
-    return ["tovicli", *SUBTREE, *(word.format(**facts) for word in words)], [replay, requests], host.env
+    host.record(requests, *(word.format(**facts) for word in record))
+    return ["tovicli", *SUBTREE, *(word.format(**facts) for word in words)], [suite.build.program("bench_replay"), requests], host.env
 
 
 def format(suite):
