@@ -163,7 +163,7 @@ class Host:
         """What a user can see of the host and its array. Bindings are left out: a volume that is bound and not mounted
         is mounted or deleted like any other."""
         store = self.root / "host.db"
-        stored = {name: [] for name in ("providers", "arrays", "containers", "mounted")}
+        stored = {name: [] for name in ("providers", "arrays", "containers", "mounted", "outages", "settings")}
         if store.exists() and store.stat().st_size > 0:
             stored = {
                 "providers": self.rows(store, "SELECT name, url, aux_text FROM provider ORDER BY id"),
@@ -172,6 +172,8 @@ class Host:
                 "containers": self.rows(store, "SELECT name, container_id FROM file_system ORDER BY name"),
                 # Mounted or on the way; the rest of a volume's story is told by the directories.
                 "mounted": self.rows(store, "SELECT uuid, directory_name FROM volume WHERE state IN (0, 2) ORDER BY 1"),
+                "outages": self.rows(store, "SELECT uid FROM endpoint_outage ORDER BY 1"),
+                "settings": self.rows(store, "SELECT name, value FROM setting ORDER BY 1"),
             }
         return {
             **stored,

@@ -9,23 +9,25 @@ import collections
 import re
 import subprocess
 
-# What may leave something half done when it does not happen, or happens last.
-CHANGING = {"pwrite64", "write", "ftruncate", "fsync", "fdatasync", "unlink", "unlinkat", "rename", "renameat",
-            "renameat2", "link", "linkat", "mkdir", "mkdirat", "rmdir", "fchmod", "flock", "sendto", "sendmsg",
-            "recvfrom", "recvmsg", "poll", "connect"}
 # What a device may refuse because it is full or broken.
 WRITING = {"pwrite64", "write", "ftruncate", "fsync", "fdatasync", "unlink", "unlinkat", "rename", "renameat", "renameat2",
            "link", "linkat", "mkdir", "mkdirat", "rmdir", "fchmod"}
+# What may leave something half done when it does not happen, or happens last.
+CHANGING = WRITING | {"chmod", "fchown", "flock", "bind", "sendto", "sendmsg", "writev"}
 # What asks the file system or the daemon and may be told that it cannot be had.
 ASKING = {"openat", "openat2", "newfstatat", "fstat", "pread64", "read", "getdents64", "fcntl", "flock", "connect",
           "recvfrom", "recvmsg", "sendto", "sendmsg"}
+
+# What has to do with another's answer, which is where a client and its daemon fall out of step.
+ANSWERED = {"recvfrom", "recvmsg", "poll", "connect"}
 
 # What is called as often as it takes until an answer has come; how long to wait is set only where there is a wait.
 WAITING = {"recvfrom", "recvmsg", "poll", "setsockopt"}
 
 CALL = re.compile(r"^(?:\d+ +)?(\w+)\((.*)")
 
-Call = collections.namedtuple("Call", "name number text")
+# Which call: its name, its number among those of that name, how it begins, and whether it may make a file.
+Call = collections.namedtuple("Call", "name number text makes")
 
 
 def can_trace():
@@ -43,8 +45,22 @@ def calls_of(log, of_interest):
         name = match.group(1)
         counts[name] += 1
         if any(text in line for text in of_interest):
-            calls.append(Call(name, counts[name], match.group(2)[:120]))
+            calls.append(Call(name, counts[name], match.group(2)[:120], "O_CREAT" in line))
     return calls
+
+
+def changes(call):
+    """Whether others can see that it happened. A kill at a call that only asks leaves what a kill at the next one that
+    changes something leaves."""
+    return call.makes or call.name in CHANGING
+
+
+def errors_for(call, asking):
+    """What a device may answer to a call: full or broken where something is to be written or made, and, where that is
+    looked at too, broken where something is asked."""
+    if call.name in WRITING or call.makes:
+        return ("EIO", "ENOSPC")
+    return ("EIO",) if asking and call.name in ASKING else ()
 
 
 def tracing(log):
