@@ -13,6 +13,7 @@
 #include <unistd.h>
 
 #include "Explain.h"
+#include "GuardedFiles.h"
 #include "Header.h"
 #include "sqlite/Transaction.h"
 
@@ -99,7 +100,7 @@ void Database::open(Options const &options, bool openedAgain) {
         name = nameWithoutLinks(name);
     }
     sqlite3 *opened = nullptr; // also when it fails, to ask why
-    int const code = sqlite3_open_v2(name.c_str(), &opened, flags, nullptr);
+    int const code = sqlite3_open_v2(name.c_str(), &opened, flags, guardedFiles());
     handle_.reset(opened);
     if (code == SQLITE_OK) {
         sqlite3_extended_result_codes(opened, 1);
@@ -122,6 +123,9 @@ void Database::open(Options const &options, bool openedAgain) {
     if (reason == ENOENT && !mayMakeFileBeside(path_)) {
         throw Error(ErrorKind::ReadOnly, named(identity_.kindName, path_) +
                                              " cannot be made: its directory or its file system is read-only");
+    }
+    if (reason == EINVAL) {
+        throw Error(ErrorKind::Io, named(identity_.kindName, path_) + " cannot be opened: it is no regular file");
     }
     throw explain(sqlite3_extended_errcode(opened), reason, sqlite3_errmsg(opened), named(identity_.kindName, path_),
                   busyTimeout_);

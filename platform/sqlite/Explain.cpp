@@ -7,6 +7,8 @@
 
 #include <sqlite3.h>
 
+#include "GuardedFiles.h"
+
 namespace Sqlite {
 namespace {
 
@@ -39,6 +41,20 @@ Error explainIo(int code, int systemError, char const *detail, std::string const
     return Error(ErrorKind::Io, name + action + systemWords(systemError, detail));
 }
 
+Error explainCannotOpen(int code, int systemError, char const *detail, std::string const &name) {
+    switch (code) {
+    case codeNoRegularFile:
+        return Error(ErrorKind::Io,
+                     name + " cannot be used: what lies beside it in the place of its journal is no regular file");
+    case codeNamesAnotherFile:
+        return Error(ErrorKind::Io, name + " cannot be used: the journal beside it named another file to remove, as "
+                                           "none of ours does; that file was left alone");
+    default:
+        return Error(systemError == ENOENT ? ErrorKind::Missing : ErrorKind::Io,
+                     name + " cannot be opened: " + systemWords(systemError, detail));
+    }
+}
+
 } // namespace
 
 std::string named(std::string const &kindName, std::string const &path) {
@@ -66,8 +82,7 @@ Error explain(int code, int systemError, char const *detail, std::string const &
     case SQLITE_IOERR:
         return explainIo(code, systemError, detail, name);
     case SQLITE_CANTOPEN:
-        return Error(systemError == ENOENT ? ErrorKind::Missing : ErrorKind::Io,
-                     name + " cannot be opened: " + systemWords(systemError, detail));
+        return explainCannotOpen(code, systemError, detail, name);
     case SQLITE_CONSTRAINT:
         return Error(ErrorKind::Constraint, name + " refuses the change: " + detail);
     case SQLITE_NOMEM:

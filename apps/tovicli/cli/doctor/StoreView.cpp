@@ -6,12 +6,15 @@
 #include <cstdlib>
 #include <cstring>
 #include <exception>
+#include <fcntl.h>
 #include <filesystem>
+#include <stdexcept>
 #include <sys/stat.h>
 #include <thread>
 #include <unistd.h>
 
 #include "wire/Paths.h"
+#include "wire/UniqueFd.h"
 
 namespace Tovicli::Cli {
 
@@ -74,12 +77,25 @@ StoreView read(std::string const &root, Milliseconds patience) {
     return {store.providers(), store.fileSystems(), store.volumes(), store.endpointOutages()};
 }
 
+/// Copies a regular file, whatever is put in its place meanwhile: a link is not followed, a pipe not waited for.
+void copyFile(std::string const &from, std::string const &to) {
+    Wire::UniqueFd const file(open(from.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    struct stat status {};
+    if (!file || fstat(file.get(), &status) != 0) {
+        throw fs::filesystem_error("cannot copy", from, std::error_code(errno, std::generic_category()));
+    }
+    if (!S_ISREG(status.st_mode)) {
+        throw std::runtime_error("'" + from + "' is no regular file");
+    }
+    fs::copy_file("/proc/self/fd/" + std::to_string(file.get()), to);
+}
+
 StoreView readCopy(std::string const &root, Milliseconds patience) {
     Scratch const scratch;
     std::string const store = Wire::Paths(root).hostStore();
     std::string const copy = Wire::Paths(scratch.path()).hostStore();
-    fs::copy_file(store, copy);
-    fs::copy_file(store + "-journal", copy + "-journal");
+    copyFile(store, copy);
+    copyFile(store + "-journal", copy + "-journal");
     return read(scratch.path(), patience);
 }
 
