@@ -74,8 +74,9 @@ class Crowds(unittest.TestCase):
         probe.messages(21)
         self.hold(resident(pid) - before, 1000 * MIB // 2)
         began = time.monotonic()
-        listed = box.lumo("storagecontainer", "add", "--container-name", "x", "--container-id", "x")
-        self.assertEqual(listed.status, 1, listed)
+        # A tool among them asks about a container, which only the daemon can tell, and is answered.
+        name, container = box.rows(box.array, "SELECT name, id FROM container LIMIT 1")[0]
+        box.done("storagecontainer", "add", "--container-name", name, "--container-id", container)
         self.assertLess(time.monotonic() - began, 10)
         for client in [*clients, flooder, probe]:
             client.close()

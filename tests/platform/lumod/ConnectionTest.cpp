@@ -327,21 +327,6 @@ TEST_F(ConnectionTest, fault_24_NumbersWhereATextShouldBeAreAnInvalidRequest) {
     }
 }
 
-TEST_F(ConnectionTest, fault_34_TheWallClockMovesNoDeadline) {
-    auto const vendor = addUsualVendor();
-    vendor->hanging.insert("queryStorageArray");
-    RawClient client(orderedPath());
-    client.send(framed([](Wire::Request::Builder request) { request.setGetStorageContainer(); }, 5, 2000));
-    turn();
-    wallClock_ += std::chrono::hours(24 * 3652);
-    turn();
-    EXPECT_FALSE(client.takeMessage().has_value());
-    EXPECT_FALSE(client.isClosed());
-    vendor->answer();
-    turn();
-    EXPECT_EQ(parsed(*client.takeMessage()).which, Wire::Reply::STORAGE_ARRAYS);
-}
-
 TEST_F(ConnectionTest, AReaderThatLeavesIsNotWorkedForAnyMore) {
     auto const vendor = addUsualVendor();
     vendor->hanging.insert("queryStorageArray");
