@@ -135,10 +135,12 @@ class PLEXA_EXPORT MetaStruct : public MetaObject {
         Held held;
     };
     union Cell {
+        // NOLINTBEGIN(modernize-use-equals-default): that would delete them, as the members have their own
         Cell() {}
         Cell(Cell const &) = delete;
         Cell &operator=(Cell const &) = delete;
         ~Cell() {}
+        // NOLINTEND(modernize-use-equals-default)
         MetaString text;
         MetaInt number;
         MetaBool truth;

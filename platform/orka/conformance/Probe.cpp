@@ -5,6 +5,7 @@
 
 namespace Orka::Conformance {
 
+// NOLINTNEXTLINE(cert-msc32-c,cert-msc51-cpp): begin() seeds
 Probe::Probe(Surroundings const &surroundings, Ground const &ground, Snapshot const &before)
     : surroundings_(surroundings)
     , ground_(ground)

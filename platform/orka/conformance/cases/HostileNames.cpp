@@ -29,6 +29,7 @@ std::vector<HostileName> hostileNames() {
         {"delete", "the character DEL", "a\x7f"},
         {"c1-control", "a C1 control character", "a\xc2\x9b"},
         {"bidi", "a turn of the direction of writing",
+         // NOLINTNEXTLINE(misc-misleading-bidirectional): that is what is tried
          "a\xe2\x80\xae"
          "b"},
         {"combining", "a combining character", "e\xcc\x81"},
@@ -67,7 +68,7 @@ void refusedOrKept(Probe &probe, std::string const &name) {
         expectEqual("the container's volumes after a refusal", before, probe.list(probe.containerId()));
         return;
     }
-    auto const made = outcome.value();
+    auto const &made = outcome.value();
     expectEqual("the name in the answer", name, made.directoryName);
     expectEqual("the name that is stored", name, probe.facts(made).directoryName);
     expectEqual("the name in the list", name, probe.list(probe.containerId()).back().directoryName);
