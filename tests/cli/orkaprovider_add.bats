@@ -87,8 +87,11 @@ setup() {
 @test "fault_49 a store that another process holds is told after the wait" {
     lumo orkaprovider add --vp-name lab --vp-url u
     hold_lock "$TOVI_ROOT/host.db"
+    local began="${EPOCHREALTIME//[!0-9]/}"
     lumo orkaprovider add --vp-name other --vp-url u
+    local waited=$((${EPOCHREALTIME//[!0-9]/} - began))
     release_lock
-    expect_failure 1 "$TOVI_ROOT/host.db"
+    expect_failure 1 "$TOVI_ROOT/host.db" "5000 ms"
+    [ "$waited" -ge 5000000 ]
     [ "$(stored_providers)" = 'lab|u' ]
 }

@@ -48,19 +48,26 @@ def main():
     complaints += [f"case {n} has no row" for n in sorted(CASES - rows.keys())]
     complaints += [f"there is no case {n}" for n in sorted(rows.keys() - CASES)]
     named = 0
+    spoken_for = {}  # which tests each row names
     for number, (_, _, _, shown) in sorted(rows.items()):
+        spoken_for[number] = set()
         # A test is named in backticks; a name that ends in * stands for all that begin so.
         for name in re.findall(r"`([^`]+)`", shown):
             named += 1
             found = [k for k in known if k == name or (name.endswith("*") and k.startswith(name[:-1]))]
+            spoken_for[number].update(found)
             if not found:
                 complaints.append(f"case {number}: there is no test '{name}'")
         if "`" not in shown and not shown.startswith(("cannot arise", "not yet")):
             complaints.append(f"case {number} names no test and does not say why")
         if shown.startswith("cannot arise") and any(number_of(name) == number for name in known):
             complaints.append(f"case {number} is said not to arise, and has a test")
-    complaints += [f"the test '{name}' is of case {number_of(name)}, which has no row"
-                   for name in sorted(known) if number_of(name) is not None and number_of(name) not in rows]
+    for name in sorted(known):
+        number = number_of(name)
+        if number is not None and number not in rows:
+            complaints.append(f"the test '{name}' is of case {number}, which has no row")
+        elif number is not None and name not in spoken_for[number]:
+            complaints.append(f"the test '{name}' is of case {number}, whose row does not name it")
     for complaint in complaints:
         print(f"docs/faults.md: {complaint}", file=sys.stderr)
     print(f"{len(rows)} cases, {named} tests named, {len(complaints)} complaints")

@@ -106,7 +106,7 @@ TEST_F(InspectionTest, ConfigVolumesOfAnUnknownContainerAreAFailure) {
     EXPECT_EQ(reply.code(), ErrorCode::NoSuchContainer);
 }
 
-TEST_F(InspectionTest, fault_21_UnknownVersionsAndMethodsAreTypedFailures) {
+TEST_F(InspectionTest, fault_21_AnUnknownVersionIsATypedFailure) {
     Reply const version = ask([](Wire::Request::Builder request) {
         request.setVersion(77);
         request.setPing();
