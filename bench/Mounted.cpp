@@ -52,7 +52,8 @@ int main(int argc, char **argv) {
     sqlite3 *database = nullptr;
     try {
         Bench::replayRecording(std::string(root) + "/run/lumod.sock", argv[1]);
-        require(database, sqlite3_open_v2(argv[2], &database, SQLITE_OPEN_READWRITE, nullptr) == SQLITE_OK);
+        require(database,
+                sqlite3_open_v2(argv[2], &database, SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX, nullptr) == SQLITE_OK);
         if (readMounted(database) == 0) {
             throw std::runtime_error("no container is mounted");
         }

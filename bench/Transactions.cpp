@@ -3,11 +3,11 @@
 // The floor of every command that changes the host: a bare program that opens a database file as the host store is
 // opened and commits as many durable transactions, one row each.
 //
-//   bench_transactions FILE COUNT STATEMENT [RECORDING SOCKET]
+//   bench_transactions FILE COUNT STATEMENT [RECORDING SOCKET FROM TO]
 //
-// STATEMENT is an INSERT whose ?1 is bound to "bench-<n>" and ?2 to a container id made of n. With a RECORDING of
-// bench_record's the program also sends its requests to the daemon behind the SOCKET: the round trip of a command that
-// needs the daemon.
+// STATEMENT is an INSERT or UPDATE whose ?1 is bound to "bench-<n>" and ?2 to a container id made of n. With a
+// RECORDING of bench_record's the program first sends its requests to the daemon behind the SOCKET, and at last renames
+// FROM to TO: the round trip and the rename of a mount.
 #include <cstdio>
 #include <cstdlib>
 #include <stdexcept>
@@ -51,20 +51,23 @@ void commitEach(sqlite3 *database, int count, char const *insert) {
 } // namespace
 
 int main(int argc, char **argv) {
-    int const count = argc == 4 || argc == 6 ? std::atoi(argv[2]) : 0;
+    int const count = argc == 4 || argc == 8 ? std::atoi(argv[2]) : 0;
     if (count < 1) {
-        std::fputs("usage: bench_transactions FILE COUNT STATEMENT [RECORDING SOCKET]\n", stderr);
+        std::fputs("usage: bench_transactions FILE COUNT STATEMENT [RECORDING SOCKET FROM TO]\n", stderr);
         return 2;
     }
     sqlite3 *database = nullptr;
     try {
-        if (argc == 6) {
+        if (argc == 8) {
             Bench::replayRecording(argv[5], argv[4]);
         }
-        check(database, sqlite3_open_v2(argv[1], &database, SQLITE_OPEN_READWRITE, nullptr));
+        check(database, sqlite3_open_v2(argv[1], &database, SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX, nullptr));
         execute(database, "PRAGMA journal_mode=DELETE; PRAGMA synchronous=EXTRA; PRAGMA foreign_keys=ON");
         commitEach(database, count, argv[3]);
         check(database, sqlite3_close(database));
+        if (argc == 8 && std::rename(argv[6], argv[7]) != 0) {
+            throw std::runtime_error(std::string(argv[6]) + " cannot be renamed");
+        }
     } catch (std::exception const &error) {
         std::fprintf(stderr, "bench_transactions: %s\n", error.what());
         return 1;

@@ -115,19 +115,24 @@ def _write_and_restore(suite, host):
 
 
 def _write_config_volume(suite, host, container):
-    """A mount and an unmount are one transaction of the host store and one request each, once the volume is bound."""
+    """A mount and an unmount are a change of one row of the host store, one request, and the rename of a directory, once the
+    volume is bound."""
     volume = ["--name", "bench", "--container-id", container]
     for command in ("add", "mount", "umount"):
         host.lumo("configlumo", command, *volume)
-    template = os.path.join(host.root, "host.db")
-    ping, socket = os.path.join(host.root, "ping"), os.path.join(host.root, "run", "lumod.sock")
+    bare, ping, here, there = (os.path.join(host.root, name) for name in ("bare.db", "ping", "here", "there"))
     host.record(ping, "ping")
-    insert = "INSERT INTO endpoint_outage (uid) VALUES (?1)"
+    os.mkdir(here)
+    change = "UPDATE volume SET state = 2, directory_name = ?1"
+    floor = [suite.build.program("bench_transactions"), bare, "1", change, ping, os.path.join(host.root, "run", "lumod.sock")]
+    # The floor undoes no mount, so every round begins with the same row: that of a volume which was unmounted just now.
+    template = shutil.copy(os.path.join(host.root, "host.db"), os.path.join(host.root, "template.db"))
     pairs = {"mount": [], "umount": []}
     for _ in range(suite.options.rounds or 60):
         for command, taken in pairs.items():
             ours = timed(["tovicli", *SUBTREE, "configlumo", command, *volume], host.env)
-            bare = durable_copy(template, os.path.join(host.root, "bare.db"))
-            taken.append((ours, timed([suite.build.program("bench_transactions"), bare, "1", insert, ping, socket], host.env)))
+            durable_copy(template, bare)
+            taken.append((ours, timed([*floor, here, there], host.env)))
+            here, there = there, here
     for command, taken in pairs.items():
         suite.report.pairs(f"write configlumo {command}", taken, 1.4, 1.4)

@@ -68,6 +68,13 @@ Store::Volume ConfigVolumes::requireMounted(LumoClient::VolumeKey const &key) {
     return *record;
 }
 
+std::optional<Store::Volume> ConfigVolumes::recordAfter(std::vector<Store::Volume> const &settled,
+                                                        std::string const &uuid) {
+    auto const seen =
+        std::find_if(settled.begin(), settled.end(), [&](Store::Volume const &volume) { return volume.uuid == uuid; });
+    return seen != settled.end() ? *seen : host_.store.volume(uuid);
+}
+
 void ConfigVolumes::mount(std::string const &name, std::string const &uuid) {
     LumoClient::Volume const bound = host_.client.bindVirtualVolume(keyOf(name, uuid), channel_);
     try {
@@ -91,7 +98,7 @@ void ConfigVolumes::place(LumoClient::Volume const &bound) {
     VolumeDirectories directories(host_);
     Store::HostStore::Change change(host_.store);
     auto const &settled = directories.finishUnsettled();
-    if (auto const record = host_.store.volume(bound.uuid); record && isMounted(*record)) {
+    if (auto const record = recordAfter(settled, bound.uuid); record && isMounted(*record)) {
         throw Wire::Failure(Wire::ErrorCode::AlreadyExists,
                             "the config volume '" + record->directoryName + "' (" + record->uuid +
                                 ") is mounted already in the storage container '" + containerName_ + '\'');
@@ -130,7 +137,10 @@ void ConfigVolumes::unmount(std::string const &name, std::string const &uuid) {
         {
             Store::HostStore::Change change(host_.store);
             auto const &settled = directories.finishUnsettled();
-            requireMounted({containerId_, volume.uuid, {}}); // still
+            // Still: asked as before, since a question of another form costs more than its answer.
+            if (auto const again = recordOf(key); !again || again->uuid != volume.uuid || !isMounted(*again)) {
+                requireMounted({containerId_, volume.uuid, {}});
+            }
             host_.store.putVolumes({inState(volume, Store::VolumeState::Unmounting)}, settled);
             change.commit();
         }

@@ -27,6 +27,8 @@ private:
     std::optional<Store::Volume> recordOf(LumoClient::VolumeKey const &key);
     /// What this host still has of a volume: the mounted one, or by name every one that was put away under it.
     std::vector<Store::Volume> recordsOf(LumoClient::VolumeKey const &key, std::vector<Store::Volume> const &settled);
+    /// The record of a volume of any container, which need not be read when its change has just been finished.
+    std::optional<Store::Volume> recordAfter(std::vector<Store::Volume> const &settled, std::string const &uuid);
     Store::Volume requireMounted(LumoClient::VolumeKey const &key);
     void place(LumoClient::Volume const &bound);
     void forget(Store::Volume const &volume);
