@@ -105,6 +105,9 @@ void Database::open(Options const &options, bool openedAgain) {
     if (code == SQLITE_OK) {
         sqlite3_extended_result_codes(opened, 1);
         sqlite3_busy_timeout(opened, static_cast<int>(options.busyTimeout.count()));
+        if (identity_.isFromOthers) {
+            sqlite3_limit(opened, SQLITE_LIMIT_LENGTH, rowBytesMax);
+        }
         return;
     }
     if (sqlite3_extended_errcode(opened) == SQLITE_CANTOPEN_SYMLINK) {

@@ -83,6 +83,9 @@ Error explain(int code, int systemError, char const *detail, std::string const &
         return explainIo(code, systemError, detail, name);
     case SQLITE_CANTOPEN:
         return explainCannotOpen(code, systemError, detail, name);
+    case SQLITE_TOOBIG:
+        return Error(ErrorKind::Malformed, name + " cannot be used: a row of it is longer than " +
+                                               std::to_string(rowBytesMax >> 20) + " MiB");
     case SQLITE_CONSTRAINT:
         return Error(ErrorKind::Constraint, name + " refuses the change: " + detail);
     case SQLITE_NOMEM:

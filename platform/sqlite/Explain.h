@@ -8,6 +8,10 @@
 
 namespace Sqlite {
 
+/// How long a row, and so a text, of a file from others may be: twice a request to the daemon, so that what a request
+/// has written can be read.
+inline constexpr int rowBytesMax = 2 << 20;
+
 /// "the host store '/srv/host.db'": how every sentence begins.
 std::string named(std::string const &kindName, std::string const &path);
 

@@ -3,6 +3,7 @@
 
 #include <cerrno>
 #include <mutex>
+#include <new>
 
 #include <fcntl.h>
 #include <sqlite3.h>
@@ -18,6 +19,7 @@ static_assert((codeNoRegularFile & 0xff) == SQLITE_CANTOPEN && (codeNamesAnother
 struct Guard {
     sqlite3_vfs base; // first: SQLite knows the guard by its address
     sqlite3_vfs *original;
+    Guard const *previous; // kept for the databases that were opened with it
 };
 
 bool isInTheWay(char const *path) {
@@ -57,20 +59,22 @@ char const *guardedFiles() {
     static std::mutex mutex;
     static Guard *guard = nullptr;
     std::lock_guard const lock(mutex);
-    if (guard == nullptr) {
-        sqlite3_vfs *const real = sqlite3_vfs_find("unix");
-        real->xSetSystemCall(real, "open", reinterpret_cast<sqlite3_syscall_ptr>(openWithoutWaiting));
-    }
     sqlite3_vfs *const original = sqlite3_vfs_find(nullptr);
+    if (original == nullptr) {
+        throw std::bad_alloc(); // SQLite could not begin
+    }
     if (guard != nullptr && guard->original == original && guard->base.pAppData == original->pAppData) {
         return name;
     }
-    // Once a process. Only what tests disks makes another file system the default; open databases use the guard that
-    // they were opened with, so each of them stays for good.
-    if (guard != nullptr) {
+    // Once a process: only what tests disks makes another file system the default.
+    auto *const next = new Guard{*original, original, guard};
+    if (guard == nullptr) {
+        sqlite3_vfs *const real = sqlite3_vfs_find("unix");
+        real->xSetSystemCall(real, "open", reinterpret_cast<sqlite3_syscall_ptr>(openWithoutWaiting));
+    } else {
         sqlite3_vfs_unregister(&guard->base);
     }
-    guard = new Guard{*original, original};
+    guard = next;
     guard->base.zName = name;
     guard->base.pNext = nullptr;
     guard->base.xOpen = openGuarded;

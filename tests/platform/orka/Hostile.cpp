@@ -62,6 +62,14 @@ TEST_F(HostileArrayFile, fault_48_withoutAPartOfItsLayoutIsRefused) {
     EXPECT_EQ(damage("DROP TABLE metadata"), "a part of its layout is gone");
 }
 
+TEST_F(HostileArrayFile, fault_48_withATextWithoutAnEndIsRefused) {
+    std::string const tooLong = "the array file '" + path_ + "' cannot be used: a row of it is longer than 2 MiB";
+    EXPECT_EQ(damage("UPDATE storage_array SET name = printf('%.*c', 2200000, 'x')"), tooLong);
+    EXPECT_EQ(damage("UPDATE storage_array SET name = printf('%.*c', 2000000, 'x')"), "");
+    EXPECT_EQ(damage("UPDATE sqlite_schema SET sql = sql || printf('%.*c', 2200000, ' ') WHERE name = 'metadata'"),
+              tooLong);
+}
+
 TEST_F(HostileArrayFile, fault_48_withoutABlockSizeIsRefused) {
     EXPECT_EQ(damage("UPDATE volume SET block_size = 0"),
               std::string("the virtual volume ") + webId + " has sizes that cannot be");

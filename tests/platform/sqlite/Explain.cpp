@@ -31,6 +31,7 @@ TEST(Explain, EveryResultHasAKindAndASentence) {
          "it cannot be written: it, its directory or its file system is read-only"},
         {SQLITE_PERM, 0, ErrorKind::ReadOnly,
          "it cannot be written: it, its directory or its file system is read-only"},
+        {SQLITE_TOOBIG, 0, ErrorKind::Malformed, "it cannot be used: a row of it is longer than 2 MiB"},
         {SQLITE_FULL, 0, ErrorKind::DiskFull, "it cannot be written: the disk is full; it was not changed"},
         {SQLITE_IOERR_WRITE, ENOSPC, ErrorKind::DiskFull, "it cannot be written: the disk is full; it was not changed"},
         {SQLITE_IOERR_WRITE, EDQUOT, ErrorKind::DiskFull, "it cannot be written: the disk is full; it was not changed"},

@@ -40,7 +40,8 @@ struct Identity {
     /// For sentences, with its article: "the host store".
     std::string kindName;
     /// A file that comes from others may say that it is one of ours and hold a view that never ends in the place of a
-    /// table. Where this is set, one that does not hold exactly what the schema makes is Malformed.
+    /// table. Where this is set, one that does not hold exactly what the schema makes is Malformed, and so is one with
+    /// a row of more than 2 MiB.
     bool isFromOthers = false;
 };
 
