@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include <algorithm>
 #include <string>
 
 #include "Translate.h"
@@ -178,7 +179,11 @@ void HostStore::putVolumes(std::vector<Volume> const &volumes, std::vector<Volum
             own.emplace(database);
         }
         for (Volume const &volume : settled) {
-            settle(database, volume);
+            // What is written anew below needs no settling first.
+            if (std::none_of(volumes.begin(), volumes.end(),
+                             [&](Volume const &other) { return other.uuid == volume.uuid; })) {
+                settle(database, volume);
+            }
         }
         for (Volume const &volume : volumes) {
             put(database, volume);
