@@ -26,7 +26,7 @@ kj::ArrayPtr<kj::byte> MessageBuffer::prepare(SegmentTable const &table) {
         // Powers of two, so that chunks of nearly one size do not reallocate; pages that stay unused cost nothing.
         std::size_t const capacity = std::max(leastWords, std::bit_ceil(needed));
         release();
-        words_.reset(new capnp::word[capacity]);
+        words_ = std::make_unique_for_overwrite<capnp::word[]>(capacity);
         capacityWords_ = capacity;
     }
     table_ = table;
