@@ -10,6 +10,8 @@ from harness.box import SUBTREE, Host, durable_copy, rounds_of, timed
 
 # Seconds after which a slow disk is asked for no more rounds than three.
 PATIENCE = 60
+# Containers that a host has mounted whose volumes are mounted: a command looks at each of them.
+MOUNTED = 10
 
 
 def start(suite):
@@ -83,7 +85,9 @@ def write(suite):
     with Host(suite.build, suite.options.root_on, suite.topology(1000)) as host:
         host.register()
         _write_and_restore(suite, host)
-        if suite.wanted("write configlumo mount") or suite.wanted("write configlumo umount"):
+    if suite.wanted("write configlumo mount") or suite.wanted("write configlumo umount"):
+        with Host(suite.build, suite.options.root_on, suite.topology(MOUNTED)) as host:
+            host.register()
             _write_config_volume(suite, host, host.lumo_json("storagecontainer", "load")[0]["StorageContainer Id"])
 
 
