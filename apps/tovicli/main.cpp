@@ -7,6 +7,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <fcntl.h>
+#include <new>
 #include <string>
 #include <string_view>
 #include <sys/auxv.h>
@@ -122,7 +123,12 @@ int run(int argc, char **argv) {
 } // namespace
 
 int main(int argc, char **argv) {
-    int const status = run(argc, argv);
+    int status = static_cast<int>(Tovicli::ExitStatus::Failed);
+    try {
+        status = run(argc, argv);
+    } catch (std::bad_alloc const &) { // before there was anything to report it with
+        std::fputs("tovicli: out of memory\n", stderr);
+    }
     if (!leavesAtOnce) {
         return status;
     }

@@ -3,6 +3,7 @@
 // What only the real process shows: descriptors, signals, exit status.
 #include <csignal>
 #include <cstdio>
+#include <cstdlib>
 #include <fcntl.h>
 #include <functional>
 #include <gmock/gmock.h>
@@ -51,6 +52,28 @@ TEST_F(Process, LosesNothingThatAPluginPrintsByItself) {
     EXPECT_EQ(run({"storage", "sample", "print"}), 0);
     EXPECT_EQ(output(), "42\nprinted without the tool\n");
     EXPECT_EQ(errors(), "");
+}
+
+TEST_F(Process, fault_62_AnyAllocationMayFail) {
+    if (std::string(TEST_FAILING_MALLOC).empty()) {
+        GTEST_SKIP() << "the sanitizer's allocator cannot be replaced";
+    }
+    int failures = 0;
+    int number = 1;
+    for (int status = 1; status != 0 || number < 10;
+         ++number) { // the first ones are the C++ library's, which can do without
+        ASSERT_LT(number, 2000);
+        status = process.run(TEST_TOVICLI, {"--version"}, [&number] {
+            setenv("LD_PRELOAD", TEST_FAILING_MALLOC, 1);
+            setenv("TEST_FAIL_ALLOCATION", std::to_string(number).c_str(), 1);
+        });
+        if (status != 0) {
+            ASSERT_EQ(status, 1) << number;
+            ASSERT_EQ(errors(), "tovicli: out of memory\n") << number;
+            ++failures;
+        }
+    }
+    EXPECT_GT(failures, 50);
 }
 
 TEST_F(Process, fault_6_ClosedDescriptorsAreOccupiedBeforeAnythingIsOpened) {
