@@ -77,6 +77,13 @@ protected:
         });
         ASSERT_FALSE(bytesOf(at("a.db-journal")).empty());
     }
+
+    void expectCannotBeWritten(std::optional<Sqlite::Error> const &error) const {
+        ASSERT_TRUE(error);
+        EXPECT_EQ(error->kind(), ErrorKind::ReadOnly);
+        EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") +
+                                         "' cannot be written: it, its directory or its file system is read-only");
+    }
 };
 
 TEST_F(FaultTest, fault_48_FlippedBytesAreNamedAndNothingIsOverwritten) {
@@ -134,10 +141,7 @@ TEST_F(FaultTest, fault_50_AJournalThatCannotBeMadeInAReadOnlyDirectoryIsNotCall
     none.end();
     unprivileged.reset();
     ::chmod(directory_.c_str(), 0755);
-    ASSERT_TRUE(error);
-    EXPECT_EQ(error->kind(), ErrorKind::ReadOnly);
-    EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") +
-                                     "' cannot be written: it, its directory or its file system is read-only");
+    expectCannotBeWritten(error);
     EXPECT_EQ(countItems(database), 1);
 }
 
@@ -277,10 +281,7 @@ TEST_F(FaultTest, fault_50_AFileInADirectoryWithoutRoomForAJournalStillReads) {
     });
     unprivileged.reset();
     ::chmod(directory_.c_str(), 0755);
-    ASSERT_TRUE(error);
-    EXPECT_EQ(error->kind(), ErrorKind::ReadOnly);
-    EXPECT_EQ(error->sentence(), "the test file '" + at("a.db") +
-                                     "' cannot be written: it, its directory or its file system is read-only");
+    expectCannotBeWritten(error);
 }
 
 TEST_F(FaultTest, fault_52_AReaderRollsAKilledWriterBack) {
